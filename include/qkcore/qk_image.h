@@ -1,0 +1,92 @@
+// Images: the QKImage object, pixel-format codes, buffer sizes and the image
+// operations.
+#ifndef QKCORE_QK_IMAGE_H
+#define QKCORE_QK_IMAGE_H
+
+#include <stdint.h>
+#include <stdlib.h>
+
+#include "qk_common.h"
+
+// A format code is four characters, the first in the lowest byte.
+constexpr uint32_t QK_FOURCC(char a, char b, char c, char d) {
+    return uint32_t(uint8_t(a)) | uint32_t(uint8_t(b)) << 8 | uint32_t(uint8_t(c)) << 16 |
+           uint32_t(uint8_t(d)) << 24;
+}
+
+// RGB family: bytes in memory in the order of the letters.
+constexpr uint32_t QK_FORMAT_RGBA = QK_FOURCC('R', 'G', 'B', 'A');
+constexpr uint32_t QK_FORMAT_BGRA = QK_FOURCC('B', 'G', 'R', 'A');
+constexpr uint32_t QK_FORMAT_ARGB = QK_FOURCC('A', 'R', 'G', 'B');
+constexpr uint32_t QK_FORMAT_ABGR = QK_FOURCC('A', 'B', 'G', 'R');
+constexpr uint32_t QK_FORMAT_RGB8 = QK_FOURCC('R', 'G', 'B', '8');
+constexpr uint32_t QK_FORMAT_BGR8 = QK_FOURCC('B', 'G', 'R', '8');
+// YUV family.
+constexpr uint32_t QK_FORMAT_GREY = QK_FOURCC('G', 'R', 'E', 'Y');  // luma only
+constexpr uint32_t QK_FORMAT_YUYV = QK_FOURCC('Y', 'U', 'Y', 'V');  // 4:2:2 Y0 U Y1 V
+constexpr uint32_t QK_FORMAT_YVYU = QK_FOURCC('Y', 'V', 'Y', 'U');  // 4:2:2 Y0 V Y1 U
+constexpr uint32_t QK_FORMAT_NV12 = QK_FOURCC('N', 'V', '1', '2');  // 4:2:0 Y, then UV pairs
+constexpr uint32_t QK_FORMAT_NV21 = QK_FOURCC('N', 'V', '2', '1');  // 4:2:0 Y, then VU pairs
+constexpr uint32_t QK_FORMAT_YV12 = QK_FOURCC('Y', 'V', '1', '2');  // 4:2:0 Y, V plane, U plane
+constexpr uint32_t QK_FORMAT_YUVP = QK_FOURCC('Y', 'U', 'V', 'P');  // 4:2:0 Y, U plane, V plane
+// Copy-only formats.
+constexpr uint32_t QK_FORMAT_D16 = QK_FOURCC('D', '1', '6', '\0');  // 16-bit depth samples
+constexpr uint32_t QK_FORMAT_PCL = QK_FOURCC('P', 'C', 'L', '\0');  // 36-byte header + 16 bytes a point
+// An encoded stream whose length is the image's recorded size.
+constexpr uint32_t QK_FORMAT_JPEG = QK_FOURCC('J', 'P', 'E', 'G');
+
+// The image object. The field order and widths are a binary contract with
+// modules outside the library: do not reorder or resize them.
+class QKImage {
+public:
+    // Frees the buffer unless it is the caller's, and forgets it.
+    virtual ~QKImage() {
+        if (data != nullptr && isWrapped == 0) free(data);
+        data = nullptr;
+        isWrapped = 0;
+        size = 0;
+        chromaOffset = 0;
+    }
+
+    uint8_t* data = nullptr;    // pixel buffer, or null
+    int32_t width = 0;
+    int32_t height = 0;
+    uint32_t format = 0;        // format code
+    uint32_t isWrapped = 0;     // nonzero: the buffer is the caller's and never freed here
+    uint64_t size = 0;          // buffer bytes; 0 means "not recorded: use the size rule"
+    uint32_t chromaOffset = 0;  // 4:2:0 chroma start; 0 means right after the luma plane
+};
+
+extern "C" {
+
+// Bytes a buffer of these dimensions and format occupies, or 0 when none can
+// be given (a dimension below 1, an encoded or unknown format, or a size that
+// would not fit in a signed 32-bit byte count).
+QK_API uint64_t QKImage_requiredSize(int32_t width, int32_t height, uint32_t format);
+// The image's recorded size when nonzero, else the size rule of its fields;
+// 0 for null.
+QK_API uint64_t QKImage_size(const QKImage* image);
+
+// Lifecycle. Every image returned here belongs to the caller, who releases it
+// with QKImage_destroy.
+QK_API QKImage* QKImage_createEmpty(int32_t width, int32_t height, uint32_t format);
+QK_API QKImage* QKImage_createNew(int32_t width, int32_t height, uint32_t format);
+// Wraps the caller's buffer (never freed by the library). A negative size is
+// recorded as 0; a null buffer gives an image without buffer.
+QK_API QKImage* QKImage_createWrap(void* data, int32_t width, int32_t height, uint32_t format,
+                                   int32_t size, uint32_t chromaOffset);
+// Gives an image without buffer an owned one; returns the buffer's byte count
+// or a negative status.
+QK_API int32_t QKImage_allocate(QKImage* image);
+QK_API void QKImage_deallocate(QKImage* image);
+QK_API void QKImage_reset(QKImage* image);
+QK_API void QKImage_destroy(QKImage* image);
+QK_API QKImage* QKImage_clone(const QKImage* source);
+QK_API QKImage* QKImage_cloneHeader(const QKImage* source);
+// Makes the image use the caller's buffer (its own owned buffer is freed
+// first); returns the buffer's byte count or a negative status.
+QK_API int32_t QKImage_wrap(QKImage* image, void* data, int32_t size, uint32_t chromaOffset);
+
+}  // extern "C"
+
+#endif  // QKCORE_QK_IMAGE_H
