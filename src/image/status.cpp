@@ -1,0 +1,27 @@
+#include "image/status.h"
+
+#include "util/log.h"
+
+namespace qk {
+
+const char* status_name(int32_t status) {
+    switch (status) {
+        case QK_OK: return "QK_OK";
+        case QK_ERROR_NULL_PARAM: return "QK_ERROR_NULL_PARAM";
+        case QK_ERROR_INVALID_PARAM: return "QK_ERROR_INVALID_PARAM";
+        case QK_ERROR_INVALID_SIZE: return "QK_ERROR_INVALID_SIZE";
+        case QK_ERROR_ALLOC_FAILED: return "QK_ERROR_ALLOC_FAILED";
+        case QK_ERROR_UNSUPPORTED: return "QK_ERROR_UNSUPPORTED";
+        case QK_ERROR_IO_FAILED: return "QK_ERROR_IO_FAILED";
+        case QK_ERROR_CODEC_FAILED: return "QK_ERROR_CODEC_FAILED";
+        case QK_ERROR_NOT_IMPLEMENTED: return "QK_ERROR_NOT_IMPLEMENTED";
+        default: return "QK_ERROR_UNKNOWN";
+    }
+}
+
+int32_t report_failure(int32_t status, const char* file, int line) {
+    QK_LOG(QK_LOG_ERROR, "%s (%d): %s:%d", status_name(status), status, file, line);
+    return status;
+}
+
+}  // namespace qk
