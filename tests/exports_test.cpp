@@ -1,0 +1,77 @@
+// The shared library must export exactly the documented names: a missing one
+// breaks clients at load time, an extra one becomes an interface by accident.
+#include <elf.h>
+#include <gtest/gtest.h>
+
+#include <fstream>
+#include <iterator>
+#include <set>
+#include <string>
+#include <vector>
+
+namespace {
+
+const std::set<std::string> kDocumented = {
+    // Logging and timing.
+    "HX_LogMsg",
+    "_Z13AndroidLogMsgiz",              // AndroidLogMsg(int, ...)
+    "_Z13DefaultLogMsgiz",              // DefaultLogMsg(int, ...)
+    "_ZN8TimeStatC1EPKcb",              // TimeStat::TimeStat(const char*, bool)
+    "_ZN8TimeStatC2EPKcb",
+    "_ZN8TimeStatC1EPKcS1_ib",          // TimeStat::TimeStat(const char*, const char*, int, bool)
+    "_ZN8TimeStatC2EPKcS1_ib",
+    "_ZN8TimeStatD1Ev",                 // TimeStat::~TimeStat()
+    "_ZN8TimeStatD2Ev",
+    "_ZN8TimeStatclEv",                 // TimeStat::operator()()
+    "_ZN8TimeStat9TimeStampEPKc",       // TimeStat::TimeStamp(const char*)
+    // Utilities.
+    "_Z4sortPiPPcii",                   // sort(int*, char**, int, int)
+    "_Z4swapPiS_PcS0_",                 // swap(int*, int*, char*, char*)
+    // Images.
+    "QKImage_requiredSize",
+    "QKImage_size",
+    "QKImage_createEmpty",
+    "QKImage_createNew",
+    "QKImage_createWrap",
+    "QKImage_allocate",
+    "QKImage_deallocate",
+    "QKImage_reset",
+    "QKImage_destroy",
+    "QKImage_clone",
+    "QKImage_cloneHeader",
+    "QKImage_wrap",
+};
+
+// Names of the defined, globally visible entries of an ELF64 file's dynamic
+// symbol table.
+std::set<std::string> exported_names(const std::string& path) {
+    std::ifstream file(path, std::ios::binary);
+    std::vector<char> bytes((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
+    std::set<std::string> names;
+    if (bytes.size() < sizeof(Elf64_Ehdr)) return names;
+    const auto* header = reinterpret_cast<const Elf64_Ehdr*>(bytes.data());
+    const auto* sections = reinterpret_cast<const Elf64_Shdr*>(bytes.data() + header->e_shoff);
+    for (int i = 0; i < header->e_shnum; ++i) {
+        if (sections[i].sh_type != SHT_DYNSYM) continue;
+        const char* strings = bytes.data() + sections[sections[i].sh_link].sh_offset;
+        const auto* symbols = reinterpret_cast<const Elf64_Sym*>(bytes.data() + sections[i].sh_offset);
+        size_t count = sections[i].sh_size / sizeof(Elf64_Sym);
+        for (size_t s = 1; s < count; ++s) {
+            const Elf64_Sym& symbol = symbols[s];
+            unsigned char binding = ELF64_ST_BIND(symbol.st_info);
+            if (symbol.st_shndx == SHN_UNDEF || (binding != STB_GLOBAL && binding != STB_WEAK)) continue;
+            if (ELF64_ST_VISIBILITY(symbol.st_other) == STV_HIDDEN) continue;
+            names.insert(strings + symbol.st_name);
+        }
+    }
+    return names;
+}
+
+TEST(Exports, ExactlyTheDocumentedSymbols) {
+    std::set<std::string> exported = exported_names(QK_LIBRARY_FILE);
+    ASSERT_FALSE(exported.empty()) << "no dynamic symbols read from " << QK_LIBRARY_FILE;
+    for (const std::string& name : kDocumented) EXPECT_TRUE(exported.count(name)) << "missing: " << name;
+    for (const std::string& name : exported) EXPECT_TRUE(kDocumented.count(name)) << "extra: " << name;
+}
+
+}  // namespace
