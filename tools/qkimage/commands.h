@@ -1,0 +1,8 @@
+// The subcommands of qkimage. Each takes the arguments after its own name and
+// returns the process exit status.
+#ifndef QKIMAGE_COMMANDS_H
+#define QKIMAGE_COMMANDS_H
+
+int cmd_formats(int argc, char** argv);
+
+#endif  // QKIMAGE_COMMANDS_H

@@ -1,0 +1,34 @@
+// qkimage: inspect and transform raw image frames with the qkcore library.
+#include <stdio.h>
+#include <string.h>
+
+#include "commands.h"
+
+namespace {
+
+struct Command {
+    const char* name;
+    int (*run)(int argc, char** argv);
+    const char* usage;
+};
+
+const Command kCommands[] = {
+    {"formats", cmd_formats, "formats WIDTHxHEIGHT          byte size of every format at that size"},
+};
+
+int usage() {
+    fprintf(stderr, "usage: qkimage COMMAND [ARGS...]\ncommands:\n");
+    for (const Command& command : kCommands) fprintf(stderr, "  %s\n", command.usage);
+    return 2;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    if (argc < 2) return usage();
+    for (const Command& command : kCommands) {
+        if (strcmp(argv[1], command.name) == 0) return command.run(argc - 2, argv + 2);
+    }
+    fprintf(stderr, "qkimage: unknown command '%s'\n", argv[1]);
+    return usage();
+}
