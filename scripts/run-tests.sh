@@ -1,0 +1,20 @@
+#!/usr/bin/env bash
+# Builds and runs every test twice: in the optimised build, and under
+# AddressSanitizer + UndefinedBehaviorSanitizer with leak checking.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+scripts/install-deps.sh
+jobs=$(nproc)
+
+echo "== optimised build"
+cmake -S . -B build/release -G Ninja -DCMAKE_BUILD_TYPE=Release
+cmake --build build/release -j "$jobs"
+(cd build/release && ctest -j "$jobs" --timeout 600 --output-on-failure)
+
+echo "== AddressSanitizer + UndefinedBehaviorSanitizer build"
+cmake -S . -B build/asan -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo -DQK_SANITIZE=ON -DQK_BUILD_BENCH=OFF
+cmake --build build/asan -j "$jobs"
+(cd build/asan &&
+  ASAN_OPTIONS=detect_leaks=1:abort_on_error=1:strict_string_checks=1 \
+  UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1 \
+  ctest -j "$jobs" --timeout 600 --output-on-failure)
