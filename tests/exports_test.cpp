@@ -40,6 +40,17 @@ const std::set<std::string> kDocumented = {
     "QKImage_clone",
     "QKImage_cloneHeader",
     "QKImage_wrap",
+    // Options.
+    "QKOption_RegisterNew",
+    "QKOption_FindByName",
+    "QKOption_FindIdByName",
+    "QKOption_FindById",
+    "QKOption_FindNameById",
+    "QKOption_CheckValueI",
+    "QKOption_CheckValueF",
+    "QKOption_CheckValueS",
+    "QKOption_ParseStringI",
+    "QKOption_ParseStringF",
 };
 
 // Names of the defined, globally visible entries of an ELF64 file's dynamic
