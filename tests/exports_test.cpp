@@ -40,6 +40,10 @@ const std::set<std::string> kDocumented = {
     "QKImage_clone",
     "QKImage_cloneHeader",
     "QKImage_wrap",
+    // Converters of the optional module.
+    "QKConverter_create",
+    "QKConverter_convert",
+    "QKConverter_release",
     // Options.
     "QKOption_RegisterNew",
     "QKOption_FindByName",
