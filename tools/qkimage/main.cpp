@@ -14,6 +14,7 @@ struct Command {
 
 const Command kCommands[] = {
     {"formats", cmd_formats, "formats WIDTHxHEIGHT          byte size of every format at that size"},
+    {"options", cmd_options, "options OPTION_STRING NAME... the named items' values, as the option readers read them"},
 };
 
 int usage() {
