@@ -27,18 +27,22 @@ TEST(OptionRegisterFirstUse, RacingThreadsShareOneRegisterAndDrawDistinctKeys) {
     }
     qktest::LogCapture log;  // installed before the threads start
     std::mutex registration;  // clients serialise registrations; first use needs no lock
-    std::atomic<int> waiting{kThreads};
+    std::atomic<int> starting{kThreads};
+    std::atomic<int> lookups_running{kThreads};
     const qk::options::Register* seen[kThreads] = {};
     std::vector<int32_t> keys[kThreads];
 
     std::vector<std::thread> threads;
     for (int t = 0; t < kThreads; ++t) {
         threads.emplace_back([&, t] {
-            waiting.fetch_sub(1);
-            while (waiting.load() > 0) std::this_thread::yield();
+            starting.fetch_sub(1);
+            while (starting.load() > 0) std::this_thread::yield();
             QKOption_FindById(t + 1);  // a lookup is a first use too
             seen[t] = &qk::options::option_register();
             for (int k = 0; k < kKeysPerThread; ++k) keys[t].push_back(qk::options::draw_key());
+            // Lookups must not overlap registrations.
+            lookups_running.fetch_sub(1);
+            while (lookups_running.load() > 0) std::this_thread::yield();
             std::lock_guard<std::mutex> lock(registration);
             QKOption_RegisterNew(&options[t]);
         });
