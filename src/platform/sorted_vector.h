@@ -28,15 +28,11 @@ public:
         return index < items_.size() && items_[index].key == key ? static_cast<ptrdiff_t>(index) : -1;
     }
 
-    // Puts the pair at its sorted place (replacing the value of an item with
-    // the same key) and returns its index. May throw std::bad_alloc.
+    // Puts the pair at its sorted place and returns its index. The key must
+    // not be present yet (see indexOf). May throw std::bad_alloc.
     size_t add(const Key& key, const Value& value) {
         size_t index = lower_index(key);
-        if (index < items_.size() && items_[index].key == key) {
-            items_[index].value = value;
-        } else {
-            items_.insert(items_.begin() + static_cast<ptrdiff_t>(index), Item{key, value});
-        }
+        items_.insert(items_.begin() + static_cast<ptrdiff_t>(index), Item{key, value});
         return index;
     }
 
