@@ -1,5 +1,5 @@
 // A small vector of key/value pairs kept in ascending key order, with unique
-// keys: what the device's utility library provides for ordered registers.
+// keys: the ordered container behind the options register.
 #ifndef QKCORE_SRC_PLATFORM_SORTED_VECTOR_H
 #define QKCORE_SRC_PLATFORM_SORTED_VECTOR_H
 
