@@ -40,6 +40,10 @@ const std::set<std::string> kDocumented = {
     "QKImage_clone",
     "QKImage_cloneHeader",
     "QKImage_wrap",
+    "QKImage_convert",
+    "QKImage_copyAndConvert",
+    // Converters.
+    "_Z7csc_runPK7QKImagePS_",          // csc_run(const QKImage*, QKImage*)
 };
 
 // Names of the defined, globally visible entries of an ELF64 file's dynamic
