@@ -8,7 +8,7 @@
 
 namespace qk {
 
-inline uint8_t clamp_byte(int value) {
+constexpr uint8_t clamp_byte(int value) {
     return static_cast<uint8_t>(value < 0 ? 0 : (value > 255 ? 255 : value));
 }
 

@@ -155,13 +155,41 @@ inline int green_offset(int32_t numerator) {
     return static_cast<int>(static_cast<uint32_t>(numerator + kShift * 100000) / 100000u) - kShift;
 }
 
+// Clamping by table: branch-free, and far faster than compare-and-select on
+// noisy frames. Luma plus any offset above stays within [-227, 480].
+constexpr int kClampBias = 256;
+struct ClampTable {
+    uint8_t byte[768];
+};
+constexpr ClampTable make_clamp_table() {
+    ClampTable table{};
+    for (int i = 0; i < 768; ++i) table.byte[i] = clamp_byte(i - kClampBias);
+    return table;
+}
+constexpr ClampTable kClamp = make_clamp_table();
+static_assert(kIntegerChroma.blue[0] + kClampBias >= 0 && 255 + kIntegerChroma.blue[255] + kClampBias < 768,
+              "the widest offset, blue, must stay inside the clamp table");
+
+// The clamped channel values of one chroma pair, indexed by luma.
+struct PairChannels {
+    const uint8_t* red;
+    const uint8_t* green;
+    const uint8_t* blue;
+};
+
 template <int D>
-inline void store_rgb(uint8_t* pixel, int luma, int red, int green, int blue) {
+inline void store_rgb(uint8_t* pixel, int luma, const PairChannels& c) {
     constexpr RgbLayout d = kRgbLayouts[D];
-    pixel[d.rOffset] = clamp_byte(luma + red);
-    pixel[d.gOffset] = clamp_byte(luma + green);
-    pixel[d.bOffset] = clamp_byte(luma + blue);
-    if constexpr (d.aOffset >= 0) pixel[d.aOffset] = 255;
+    if constexpr (d.bytesPerPixel == 4) {
+        // One word store per pixel instead of four byte stores.
+        const uint32_t word = uint32_t{c.red[luma]} << (8 * d.rOffset) | uint32_t{c.green[luma]} << (8 * d.gOffset) |
+                              uint32_t{c.blue[luma]} << (8 * d.bOffset) | 0xffu << (8 * d.aOffset);
+        memcpy(pixel, &word, sizeof(word));
+    } else {
+        pixel[d.rOffset] = c.red[luma];
+        pixel[d.gOffset] = c.green[luma];
+        pixel[d.bOffset] = c.blue[luma];
+    }
 }
 
 template <int D>
@@ -189,14 +217,15 @@ void yuv_to_rgb(const uint8_t* y0, const uint8_t* y1, const uint8_t* u, const ui
             }
             continue;
         }
-        const int red = kIntegerChroma.red[vb];
-        const int blue = kIntegerChroma.blue[ub];
-        const int green = green_offset(kIntegerChroma.greenU[ub] + kIntegerChroma.greenV[vb]);
-        store_rgb<D>(d0 + x * bpp, y0[x * LumaStep], red, green, blue);
-        store_rgb<D>(d0 + (x + 1) * bpp, y0[(x + 1) * LumaStep], red, green, blue);
+        const uint8_t* clamp = kClamp.byte + kClampBias;
+        const PairChannels channels{clamp + kIntegerChroma.red[vb],
+                                    clamp + green_offset(kIntegerChroma.greenU[ub] + kIntegerChroma.greenV[vb]),
+                                    clamp + kIntegerChroma.blue[ub]};
+        store_rgb<D>(d0 + x * bpp, y0[x * LumaStep], channels);
+        store_rgb<D>(d0 + (x + 1) * bpp, y0[(x + 1) * LumaStep], channels);
         if constexpr (Rows == 2) {
-            store_rgb<D>(d1 + x * bpp, y1[x * LumaStep], red, green, blue);
-            store_rgb<D>(d1 + (x + 1) * bpp, y1[(x + 1) * LumaStep], red, green, blue);
+            store_rgb<D>(d1 + x * bpp, y1[x * LumaStep], channels);
+            store_rgb<D>(d1 + (x + 1) * bpp, y1[(x + 1) * LumaStep], channels);
         }
     }
 }
