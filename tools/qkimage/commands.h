@@ -4,5 +4,6 @@
 #define QKIMAGE_COMMANDS_H
 
 int cmd_formats(int argc, char** argv);
+int cmd_convert(int argc, char** argv);
 
 #endif  // QKIMAGE_COMMANDS_H

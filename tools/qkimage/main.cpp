@@ -14,6 +14,9 @@ struct Command {
 
 const Command kCommands[] = {
     {"formats", cmd_formats, "formats WIDTHxHEIGHT          byte size of every format at that size"},
+    {"convert", cmd_convert,
+     "convert --size WxH --from FORMAT --to FORMAT IN OUT\n"
+     "                                convert a raw frame file to another pixel format"},
 };
 
 int usage() {
