@@ -10,6 +10,7 @@
 
 #include "convert/pixel.h"
 #include "convert/row.h"
+#include "convert/row_loops.h"
 
 namespace qk {
 namespace {
@@ -18,16 +19,7 @@ namespace {
 
 template <int S, int D>
 void rgb_to_rgb_bytes(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape&) {
-    constexpr RgbLayout s = kRgbLayouts[S];
-    constexpr RgbLayout d = kRgbLayouts[D];
-    for (ptrdiff_t i = 0; i < width; ++i) {
-        const uint8_t* in = src + i * s.bytesPerPixel;
-        uint8_t* out = dst + i * d.bytesPerPixel;
-        out[d.rOffset] = in[s.rOffset];
-        out[d.gOffset] = in[s.gOffset];
-        out[d.bOffset] = in[s.bOffset];
-        if constexpr (d.aOffset >= 0) out[d.aOffset] = s.aOffset >= 0 ? in[s.aOffset] : 255;
-    }
+    rgb_to_rgb_loop(src, dst, width, kRgbLayouts[S], kRgbLayouts[D]);
 }
 
 static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "the word kernels below number bytes from the low end");
@@ -77,24 +69,12 @@ constexpr auto kRgbToRgbRows = rgb_to_rgb_table(std::make_index_sequence<kRgbFor
 
 template <int S, int LumaStep>
 void rgb_to_luma(const uint8_t* rgb, uint8_t* luma, int width, const RgbToYuvShape&) {
-    constexpr RgbLayout s = kRgbLayouts[S];
-    for (ptrdiff_t i = 0; i < width; ++i) {
-        const uint8_t* in = rgb + i * s.bytesPerPixel;
-        luma[i * LumaStep] = static_cast<uint8_t>(rgb_luma(in[s.rOffset], in[s.gOffset], in[s.bOffset]));
-    }
+    rgb_to_luma_loop(rgb, luma, width, kRgbLayouts[S], LumaStep);
 }
 
 template <int S, int ChromaStep>
 void rgb_to_chroma(const uint8_t* rgb, uint8_t* u, uint8_t* v, int pairs, const RgbToYuvShape&) {
-    constexpr RgbLayout s = kRgbLayouts[S];
-    for (ptrdiff_t j = 0; j < pairs; ++j) {
-        const uint8_t* in = rgb + 2 * j * s.bytesPerPixel;
-        const int r = in[s.rOffset];
-        const int b = in[s.bOffset];
-        const int y = rgb_luma(r, in[s.gOffset], b);
-        u[j * ChromaStep] = rgb_chroma_u(b, y);
-        v[j * ChromaStep] = rgb_chroma_v(r, y);
-    }
+    rgb_to_chroma_loop(rgb, u, v, pairs, kRgbLayouts[S], ChromaStep);
 }
 
 template <size_t... I>
@@ -248,12 +228,7 @@ constexpr auto kYuvToRgbRows = yuv_to_rgb_table(std::make_index_sequence<kRgbFor
 
 template <int D>
 void grey_to_rgb(const uint8_t* luma, uint8_t* dst, int width, const RgbLayout&) {
-    constexpr RgbLayout d = kRgbLayouts[D];
-    for (ptrdiff_t i = 0; i < width; ++i) {
-        uint8_t* pixel = dst + i * d.bytesPerPixel;
-        pixel[d.rOffset] = pixel[d.gOffset] = pixel[d.bOffset] = luma[i];
-        if constexpr (d.aOffset >= 0) pixel[d.aOffset] = 255;
-    }
+    grey_to_rgb_loop(luma, dst, width, kRgbLayouts[D]);
 }
 
 template <size_t... I>
@@ -266,15 +241,12 @@ constexpr auto kGreyToRgbRows = grey_to_rgb_table(std::make_index_sequence<kRgbF
 
 template <int SrcStep, int DstStep>
 void sample_row(const uint8_t* src, int, uint8_t* dst, int, int count) {
-    for (ptrdiff_t i = 0; i < count; ++i) dst[i * DstStep] = src[i * SrcStep];
+    sample_loop(src, SrcStep, dst, DstStep, count);
 }
 
 template <int SrcStep, int DstStep>
 void chroma_row(const uint8_t* srcU, const uint8_t* srcV, int, uint8_t* dstU, uint8_t* dstV, int, int count) {
-    for (ptrdiff_t i = 0; i < count; ++i) {
-        dstU[i * DstStep] = srcU[i * SrcStep];
-        dstV[i * DstStep] = srcV[i * SrcStep];
-    }
+    chroma_loop(srcU, srcV, SrcStep, dstU, dstV, DstStep, count);
 }
 
 template <size_t... I>

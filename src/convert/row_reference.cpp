@@ -5,41 +5,21 @@
 
 #include "convert/pixel.h"
 #include "convert/row.h"
+#include "convert/row_loops.h"
 
 namespace qk {
 
 void rgb_to_rgb_row_reference(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape& shape) {
-    const RgbLayout& s = shape.src;
-    const RgbLayout& d = shape.dst;
-    for (ptrdiff_t i = 0; i < width; ++i) {
-        const uint8_t* in = src + i * s.bytesPerPixel;
-        uint8_t* out = dst + i * d.bytesPerPixel;
-        out[d.rOffset] = in[s.rOffset];
-        out[d.gOffset] = in[s.gOffset];
-        out[d.bOffset] = in[s.bOffset];
-        if (d.aOffset >= 0) out[d.aOffset] = s.aOffset >= 0 ? in[s.aOffset] : 255;
-    }
+    rgb_to_rgb_loop(src, dst, width, shape.src, shape.dst);
 }
 
 void rgb_to_luma_row_reference(const uint8_t* rgb, uint8_t* luma, int width, const RgbToYuvShape& shape) {
-    const RgbLayout& s = shape.src;
-    for (ptrdiff_t i = 0; i < width; ++i) {
-        const uint8_t* in = rgb + i * s.bytesPerPixel;
-        luma[i * shape.lumaStep] = static_cast<uint8_t>(rgb_luma(in[s.rOffset], in[s.gOffset], in[s.bOffset]));
-    }
+    rgb_to_luma_loop(rgb, luma, width, shape.src, shape.lumaStep);
 }
 
 void rgb_to_chroma_row_reference(const uint8_t* rgb, uint8_t* u, uint8_t* v, int pairs,
                                  const RgbToYuvShape& shape) {
-    const RgbLayout& s = shape.src;
-    for (ptrdiff_t j = 0; j < pairs; ++j) {
-        const uint8_t* in = rgb + 2 * j * s.bytesPerPixel;
-        const int r = in[s.rOffset];
-        const int b = in[s.bOffset];
-        const int y = rgb_luma(r, in[s.gOffset], b);
-        u[j * shape.chromaStep] = rgb_chroma_u(b, y);
-        v[j * shape.chromaStep] = rgb_chroma_v(r, y);
-    }
+    rgb_to_chroma_loop(rgb, u, v, pairs, shape.src, shape.chromaStep);
 }
 
 void yuv_to_rgb_row_reference(const uint8_t* y0, const uint8_t* y1, const uint8_t* u, const uint8_t* v,
@@ -61,23 +41,16 @@ void yuv_to_rgb_row_reference(const uint8_t* y0, const uint8_t* y1, const uint8_
 }
 
 void grey_to_rgb_row_reference(const uint8_t* luma, uint8_t* dst, int width, const RgbLayout& layout) {
-    for (ptrdiff_t i = 0; i < width; ++i) {
-        uint8_t* pixel = dst + i * layout.bytesPerPixel;
-        pixel[layout.rOffset] = pixel[layout.gOffset] = pixel[layout.bOffset] = luma[i];
-        if (layout.aOffset >= 0) pixel[layout.aOffset] = 255;
-    }
+    grey_to_rgb_loop(luma, dst, width, layout);
 }
 
 void sample_row_reference(const uint8_t* src, int srcStep, uint8_t* dst, int dstStep, int count) {
-    for (ptrdiff_t i = 0; i < count; ++i) dst[i * dstStep] = src[i * srcStep];
+    sample_loop(src, srcStep, dst, dstStep, count);
 }
 
 void chroma_row_reference(const uint8_t* srcU, const uint8_t* srcV, int srcStep, uint8_t* dstU, uint8_t* dstV,
                           int dstStep, int count) {
-    for (ptrdiff_t i = 0; i < count; ++i) {
-        dstU[i * dstStep] = srcU[i * srcStep];
-        dstV[i * dstStep] = srcV[i * srcStep];
-    }
+    chroma_loop(srcU, srcV, srcStep, dstU, dstV, dstStep, count);
 }
 
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value) {
