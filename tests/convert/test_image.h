@@ -11,22 +11,31 @@
 
 namespace qktest {
 
+struct ImageSpec {
+    uint32_t format;
+    int32_t width, height;
+    size_t bytes;  // buffer length; 0: no buffer
+    uint64_t size = 0;
+    uint32_t chromaOffset = 0;
+};
+
 // A QKImage wrapping its own vector of `bytes` bytes; `size` and
 // `chromaOffset` are recorded as given.
 class TestImage {
 public:
-    TestImage(uint32_t format, int32_t width, int32_t height, size_t bytes, uint64_t size = 0,
-              uint32_t chromaOffset = 0)
-        : buffer(bytes) {
-        for (size_t i = 0; i < bytes; ++i) buffer[i] = static_cast<uint8_t>(i * 7 + 3);
-        image.width = width;
-        image.height = height;
-        image.format = format;
+    explicit TestImage(const ImageSpec& spec) : buffer(spec.bytes) {
+        for (size_t i = 0; i < spec.bytes; ++i) buffer[i] = static_cast<uint8_t>(i * 7 + 3);
+        image.width = spec.width;
+        image.height = spec.height;
+        image.format = spec.format;
         image.data = buffer.empty() ? nullptr : buffer.data();
         image.isWrapped = image.data != nullptr;
-        image.size = size;
-        image.chromaOffset = chromaOffset;
+        image.size = spec.size;
+        image.chromaOffset = spec.chromaOffset;
     }
+    TestImage(uint32_t format, int32_t width, int32_t height, size_t bytes, uint64_t size = 0,
+              uint32_t chromaOffset = 0)
+        : TestImage(ImageSpec{format, width, height, bytes, size, chromaOffset}) {}
     TestImage(const TestImage&) = delete;
     TestImage& operator=(const TestImage&) = delete;
 
