@@ -147,6 +147,12 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
         EXPECT_TRUE(HasNoErrors(log));
         EXPECT_EQ(dst.buffer, expected);
     }
+    // An image converted into itself stays as it is.
+    TestImage image(NV21, 16, 8, 192);
+    const std::vector<uint8_t> before = image.buffer;
+    LogCapture log;
+    EXPECT_EQ(QKImage_convert(&image.image, &image.image), QK_OK);
+    EXPECT_EQ(image.buffer, before);
 }
 
 // Small hand-checked conversions, one per kind of move, as a check on the
