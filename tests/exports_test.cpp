@@ -55,6 +55,10 @@ const std::set<std::string> kDocumented = {
     "QKOption_CheckValueS",
     "QKOption_ParseStringI",
     "QKOption_ParseStringF",
+    "QKImage_convert",
+    "QKImage_copyAndConvert",
+    // Converters.
+    "_Z7csc_runPK7QKImagePS_",          // csc_run(const QKImage*, QKImage*)
 };
 
 // Names of the defined, globally visible entries of an ELF64 file's dynamic

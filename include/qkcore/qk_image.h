@@ -87,6 +87,17 @@ QK_API QKImage* QKImage_cloneHeader(const QKImage* source);
 // first); returns the buffer's byte count or a negative status.
 QK_API int32_t QKImage_wrap(QKImage* image, void* data, int32_t size, uint32_t chromaOffset);
 
+// Conversion. Converts the whole source into the destination's format, in the
+// destination's existing buffer (never allocated here): the destination takes
+// the source's width and height, and its buffer must hold the result.
+// Same-format images are copied; D16 and PCL copy only to themselves. Returns
+// QK_OK or a negative status; on failure the destination's pixels are
+// untouched.
+QK_API int32_t QKImage_convert(const QKImage* src, QKImage* dst);
+// A new image of the source's size in `format`, converted from the source;
+// null on any failure. The caller releases it with QKImage_destroy.
+QK_API QKImage* QKImage_copyAndConvert(const QKImage* src, uint32_t format);
+
 }  // extern "C"
 
 #endif  // QKCORE_QK_IMAGE_H

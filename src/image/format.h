@@ -28,10 +28,14 @@ inline int rgb_bytes_per_pixel(uint32_t f) {
 
 // Offset of a 4:2:0 image's first chroma plane: its chromaOffset when
 // nonzero, else right after the width x height luma plane. 64-bit so that
-// callers can compare it with a buffer size without wrapping.
+// callers can compare it with a buffer size without wrapping. The first form
+// serves images about to take other dimensions.
+inline uint64_t chroma_base(uint32_t chromaOffset, int32_t width, int32_t height) {
+    if (chromaOffset != 0) return chromaOffset;
+    return static_cast<uint64_t>(static_cast<int64_t>(width) * height);
+}
 inline uint64_t chroma_base(const QKImage& image) {
-    if (image.chromaOffset != 0) return image.chromaOffset;
-    return static_cast<uint64_t>(static_cast<int64_t>(image.width) * image.height);
+    return chroma_base(image.chromaOffset, image.width, image.height);
 }
 
 }  // namespace qk

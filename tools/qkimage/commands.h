@@ -5,5 +5,6 @@
 
 int cmd_formats(int argc, char** argv);
 int cmd_options(int argc, char** argv);
+int cmd_convert(int argc, char** argv);
 
 #endif  // QKIMAGE_COMMANDS_H

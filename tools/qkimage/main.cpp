@@ -15,6 +15,9 @@ struct Command {
 const Command kCommands[] = {
     {"formats", cmd_formats, "formats WIDTHxHEIGHT          byte size of every format at that size"},
     {"options", cmd_options, "options OPTION_STRING NAME... the named items' values, as the option readers read them"},
+    {"convert", cmd_convert,
+     "convert --size WxH --from FORMAT --to FORMAT IN OUT\n"
+     "                                convert a raw frame file to another pixel format"},
 };
 
 int usage() {

@@ -1,0 +1,132 @@
+// QKImage_convert: validation, same-format copies, the vendor fast path offer
+// and the routing to the four kernels.
+#include <stdint.h>
+#include <string.h>
+
+#include "convert/kernels.h"
+#include "image/format.h"
+#include "image/status.h"
+#include "qkcore/qk_converter.h"
+#include "qkcore/qk_image.h"
+#include "util/log.h"
+
+namespace {
+
+enum class Family { kRgb, kYuv, kOther };
+
+Family family_of(uint32_t format) {
+    if (qk::is_rgb_format(format)) return Family::kRgb;
+    if (qk::is_yuv_format(format)) return Family::kYuv;
+    return Family::kOther;
+}
+
+// The 4:2:0 formats need an even width and height, the packed 4:2:2 formats
+// an even width.
+bool dimensions_fit(uint32_t format, int32_t width, int32_t height) {
+    if (qk::is_yuv420_format(format)) return width % 2 == 0 && height % 2 == 0;
+    if (qk::is_packed422_format(format)) return width % 2 == 0;
+    return true;
+}
+
+// End of a 4:2:0 image's chroma, from its own chroma offset, once it has the
+// given dimensions.
+uint64_t chroma_end(const QKImage& image, int32_t width, int32_t height) {
+    return qk::chroma_base(image.chromaOffset, width, height) +
+           static_cast<uint64_t>(width) * static_cast<uint64_t>(height) / 2;
+}
+
+// Same format: one block, or luma and chroma separately when the two images
+// keep their chroma in different places (or the block would miss it).
+// memmove, because converting an image into itself is a harmless no-op.
+void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copyLength) {
+    if (qk::is_yuv420_format(src.format)) {
+        const uint64_t lumaBytes = static_cast<uint64_t>(src.width) * static_cast<uint64_t>(src.height);
+        const uint64_t srcBase = qk::chroma_base(src);
+        const uint64_t dstBase = qk::chroma_base(dst);
+        if (srcBase != dstBase || copyLength < dstBase + lumaBytes / 2) {
+            memmove(dst.data, src.data, lumaBytes);
+            memmove(dst.data + dstBase, src.data + srcBase, lumaBytes / 2);
+            return;
+        }
+    }
+    memmove(dst.data, src.data, copyLength);
+}
+
+}  // namespace
+
+int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
+    if (src == nullptr || dst == nullptr) return QK_FAIL(QK_ERROR_NULL_PARAM);
+    QK_LOG(QK_LOG_DEBUG, "[QKImage] Converting from %dx%d %4.4s to %dx%d %4.4s", src->width, src->height,
+           QK_FOURCC_STR(src->format), dst->width, dst->height, QK_FOURCC_STR(dst->format));
+    if (src->data == nullptr || dst->data == nullptr) return QK_FAIL(QK_ERROR_INVALID_PARAM);
+
+    const uint64_t needed = QKImage_requiredSize(src->width, src->height, dst->format);
+    if (needed == 0) return QK_FAIL(QK_ERROR_INVALID_PARAM);
+    if (!dimensions_fit(src->format, src->width, src->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    if (!dimensions_fit(dst->format, dst->width, dst->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+
+    const Family srcFamily = family_of(src->format);
+    const Family dstFamily = family_of(dst->format);
+    // The destination takes over the source's dimensions, which must suit its
+    // format too: an RGB or GREY source of odd size cannot become 4:2:0 or
+    // packed 4:2:2, nor a packed source of odd height 4:2:0.
+    if (srcFamily != Family::kOther && !dimensions_fit(dst->format, src->width, src->height)) {
+        return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    }
+
+    const uint64_t capacity = QKImage_size(dst);
+    if (capacity < needed) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    // A chroma offset moves the chroma elsewhere in the buffer: it must still
+    // end inside the destination's buffer, and inside the source's where the
+    // source records its size.
+    if (qk::is_yuv420_format(dst->format) && chroma_end(*dst, src->width, src->height) > capacity) {
+        return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    }
+    if (qk::is_yuv420_format(src->format) && src->size != 0 &&
+        chroma_end(*src, src->width, src->height) > src->size) {
+        return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    }
+    const uint64_t copyLength = (dst->size != 0 && dst->size == src->size) ? dst->size : needed;
+
+    dst->width = src->width;
+    dst->height = src->height;
+
+    if (src->format == dst->format) {
+        copy_same_format(*src, *dst, copyLength);
+        return QK_OK;
+    }
+    if (srcFamily == Family::kRgb && dstFamily == Family::kRgb) {
+        qk::convert_rgb_to_rgb(*src, *dst);
+        return QK_OK;
+    }
+    if (srcFamily == Family::kRgb && dstFamily == Family::kYuv) {
+        if (csc_run(src, dst) == QK_OK) {
+            QK_LOG(QK_LOG_DEBUG, "[QKImage] Conversion successful with external CSC module");
+            return QK_OK;
+        }
+        qk::convert_rgb_to_yuv(*src, *dst);
+        return QK_OK;
+    }
+    if (srcFamily == Family::kYuv && dstFamily == Family::kRgb) {
+        qk::convert_yuv_to_rgb(*src, *dst);
+        return QK_OK;
+    }
+    if (srcFamily == Family::kYuv && dstFamily == Family::kYuv) {
+        qk::convert_yuv_to_yuv(*src, *dst);
+        return QK_OK;
+    }
+    QK_LOG(QK_LOG_ERROR, "[QKImage] Can not convert %4.4s into %4.4s", QK_FOURCC_STR(src->format),
+           QK_FOURCC_STR(dst->format));
+    return QK_FAIL(QK_ERROR_UNSUPPORTED);
+}
+
+QKImage* QKImage_copyAndConvert(const QKImage* src, uint32_t format) {
+    if (src == nullptr) return nullptr;
+    QKImage* image = QKImage_createNew(src->width, src->height, format);
+    if (image == nullptr) return nullptr;
+    if (QKImage_convert(src, image) != QK_OK) {
+        QKImage_destroy(image);
+        return nullptr;
+    }
+    return image;
+}

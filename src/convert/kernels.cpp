@@ -1,0 +1,111 @@
+// The conversion kernels: resolve both layouts and the row kernels once, then
+// walk the rows.
+#include "convert/kernels.h"
+
+#include <stddef.h>
+#include <string.h>
+
+#include "convert/layout.h"
+#include "convert/row.h"
+
+namespace qk {
+namespace {
+
+// Byte offset, from uOffset (or vOffset), of the chroma row that serves image
+// row y.
+ptrdiff_t chroma_row_offset(const YuvLayout& layout, ptrdiff_t y, ptrdiff_t width) {
+    return (layout.subsampledRows ? y / 2 : y) * (width / 2) * layout.chromaStep;
+}
+
+// Whether image row y writes a chroma row of this destination layout: every
+// row of a packed 4:2:2 image, the even rows of a 4:2:0 image.
+bool row_carries_chroma(const YuvLayout& layout, ptrdiff_t y) {
+    return layout.chromaStep != 0 && (!layout.subsampledRows || y % 2 == 0);
+}
+
+}  // namespace
+
+void convert_rgb_to_rgb(const QKImage& src, QKImage& dst) {
+    const int s = rgb_format_index(src.format);
+    const int d = rgb_format_index(dst.format);
+    const RgbToRgbShape shape{kRgbLayouts[s], kRgbLayouts[d]};
+    const RgbToRgbRow row = select_rgb_to_rgb_row(s, d);
+    const ptrdiff_t width = src.width;
+    for (ptrdiff_t y = 0; y < src.height; ++y) {
+        row(src.data + y * width * shape.src.bytesPerPixel, dst.data + y * width * shape.dst.bytesPerPixel,
+            src.width, shape);
+    }
+}
+
+void convert_rgb_to_yuv(const QKImage& src, QKImage& dst) {
+    const int s = rgb_format_index(src.format);
+    const YuvLayout out = yuv_layout(dst);
+    const RgbToYuvShape shape{kRgbLayouts[s], out.lumaStep, out.chromaStep};
+    const RgbToLumaRow luma = select_rgb_to_luma_row(s, out.lumaStep);
+    const RgbToChromaRow chroma = select_rgb_to_chroma_row(s, out.chromaStep);
+    const ptrdiff_t width = src.width;
+    for (ptrdiff_t y = 0; y < src.height; ++y) {
+        const uint8_t* in = src.data + y * width * shape.src.bytesPerPixel;
+        luma(in, dst.data + y * width * out.lumaStep, src.width, shape);
+        if (row_carries_chroma(out, y)) {
+            const ptrdiff_t offset = chroma_row_offset(out, y, width);
+            chroma(in, dst.data + out.uOffset + offset, dst.data + out.vOffset + offset, src.width / 2, shape);
+        }
+    }
+}
+
+void convert_yuv_to_rgb(const QKImage& src, QKImage& dst) {
+    const YuvLayout in = yuv_layout(src);
+    const int d = rgb_format_index(dst.format);
+    const RgbLayout& out = kRgbLayouts[d];
+    const ptrdiff_t width = src.width;
+    const ptrdiff_t rowBytes = width * out.bytesPerPixel;
+    if (in.chromaStep == 0) {
+        const GreyToRgbRow row = select_grey_to_rgb_row(d);
+        for (ptrdiff_t y = 0; y < src.height; ++y) row(src.data + y * width, dst.data + y * rowBytes, src.width, out);
+        return;
+    }
+    // A 4:2:0 source converts two rows per chroma row.
+    const int rows = in.subsampledRows ? 2 : 1;
+    const YuvToRgbShape shape{in.lumaStep, in.chromaStep, rows, out};
+    const YuvToRgbRow row = select_yuv_to_rgb_row(d, in.lumaStep, in.chromaStep, rows);
+    const ptrdiff_t lumaRowBytes = width * in.lumaStep;
+    for (ptrdiff_t y = 0; y < src.height; y += rows) {
+        const ptrdiff_t offset = chroma_row_offset(in, y, width);
+        const uint8_t* luma = src.data + y * lumaRowBytes;
+        uint8_t* pixels = dst.data + y * rowBytes;
+        row(luma, rows == 2 ? luma + lumaRowBytes : nullptr, src.data + in.uOffset + offset,
+            src.data + in.vOffset + offset, pixels, rows == 2 ? pixels + rowBytes : nullptr, src.width, shape);
+    }
+}
+
+void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
+    const YuvLayout in = yuv_layout(src);
+    const YuvLayout out = yuv_layout(dst);
+    const ptrdiff_t width = src.width;
+    // Planar luma on both sides is one block; otherwise luma moves row by
+    // row together with the chroma of the same rows, while they are cached.
+    const bool blockLuma = in.lumaStep == 1 && out.lumaStep == 1;
+    if (blockLuma) memcpy(dst.data, src.data, static_cast<size_t>(width) * static_cast<size_t>(src.height));
+    const SampleRow luma = select_sample_row(in.lumaStep, out.lumaStep);
+    const ChromaRow chroma = select_chroma_row(in.chromaStep, out.chromaStep);
+    for (ptrdiff_t y = 0; y < src.height; ++y) {
+        if (!blockLuma) {
+            luma(src.data + y * width * in.lumaStep, in.lumaStep, dst.data + y * width * out.lumaStep, out.lumaStep,
+                 src.width);
+        }
+        if (!row_carries_chroma(out, y)) continue;
+        uint8_t* u = dst.data + out.uOffset + chroma_row_offset(out, y, width);
+        uint8_t* v = dst.data + out.vOffset + chroma_row_offset(out, y, width);
+        if (in.chromaStep == 0) {
+            // Chroma made from GREY is 127, not the neutral 128.
+            fill_chroma_row(u, v, out.chromaStep, src.width / 2, 127);
+        } else {
+            const ptrdiff_t offset = chroma_row_offset(in, y, width);
+            chroma(src.data + in.uOffset + offset, src.data + in.vOffset + offset, in.chromaStep, u, v,
+                   out.chromaStep, src.width / 2);
+        }
+    }
+}
+
+}  // namespace qk

@@ -1,0 +1,54 @@
+// Per-pixel colour arithmetic shared by the row kernels: full-range BT.601,
+// fixed point from RGB to YUV, double precision (or its exact integer
+// equivalent) from YUV to RGB.
+#ifndef QKCORE_SRC_CONVERT_PIXEL_H
+#define QKCORE_SRC_CONVERT_PIXEL_H
+
+#include <stdint.h>
+
+namespace qk {
+
+constexpr uint8_t clamp_byte(int value) {
+    return static_cast<uint8_t>(value < 0 ? 0 : (value > 255 ? 255 : value));
+}
+
+// RGB to YUV. The luma weights add up to exactly 65536, so no clamp is needed
+// and no rounding bias is added.
+inline int rgb_luma(uint32_t r, uint32_t g, uint32_t b) {
+    return static_cast<int>((19595u * r + 38470u * g + 7471u * b) >> 16);
+}
+// `>>` of a negative product is an arithmetic shift (rounds towards minus
+// infinity) with every compiler we target.
+inline uint8_t rgb_chroma_u(int b, int luma) { return clamp_byte((((b - luma) * 36962) >> 16) + 128); }
+inline uint8_t rgb_chroma_v(int r, int luma) { return clamp_byte((((r - luma) * 46727) >> 16) + 128); }
+
+// YUV to RGB in double precision: the defining form. The four products are
+// made once per chroma pair.
+struct ChromaProducts {
+    double gu, bu, gv, rv;
+};
+inline ChromaProducts chroma_products(int u_byte, int v_byte) {
+    const double u = u_byte - 128;
+    const double v = v_byte - 128;
+    return {u * 0.34414, u * 1.772, v * 0.71414, v * 1.402};
+}
+// Truncation towards zero, then clamping.
+inline uint8_t double_channel(double value) { return clamp_byte(static_cast<int32_t>(value)); }
+inline void yuv_pixel_double(int luma, const ChromaProducts& c, uint8_t* r, uint8_t* g, uint8_t* b) {
+    const double y = luma;
+    *r = double_channel(y + c.rv);
+    *g = double_channel((y - c.gu) - c.gv);
+    *b = double_channel(y + c.bu);
+}
+
+// YUV to RGB in integers. For every (Y, U, V) the double form above equals
+// clamp(Y + offset) with per-pair offsets floor(1.402 v), floor(-(0.34414 u +
+// 0.71414 v)), floor(1.772 u) (u = U - 128, v = V - 128), except at one pair:
+// there the exact green offset is the integer -37, and the double steps land
+// just below it for some lumas and on it for others. Its pixels take the
+// double path. The tests prove the equivalence over all 2^24 inputs.
+inline bool chroma_needs_double_path(int u_byte, int v_byte) { return u_byte == 28 && v_byte == 228; }
+
+}  // namespace qk
+
+#endif  // QKCORE_SRC_CONVERT_PIXEL_H

@@ -1,0 +1,149 @@
+// Every faster row kernel against its reference kernel: same random input,
+// every layout it is chosen for, widths that leave tails, and a guard zone
+// after the output that neither may touch.
+#include <gtest/gtest.h>
+
+#include <random>
+#include <string>
+#include <vector>
+
+#include "convert/layout.h"
+#include "convert/row.h"
+
+namespace {
+
+using namespace qk;
+
+constexpr size_t kGuard = 16;
+const int kWidths[] = {0, 1, 2, 7, 8, 17, 34, 67};
+
+std::vector<uint8_t> random_bytes(std::mt19937& random, size_t count) {
+    std::vector<uint8_t> bytes(count);
+    for (uint8_t& byte : bytes) byte = static_cast<uint8_t>(random());
+    return bytes;
+}
+
+// Runs `write(reference?, out)` into two equally prefilled buffers and
+// compares every byte.
+template <typename Write>
+void expect_same_bytes(size_t outBytes, Write write) {
+    std::vector<uint8_t> want(outBytes + kGuard, 0xC3), got(outBytes + kGuard, 0xC3);
+    write(true, want.data());
+    write(false, got.data());
+    EXPECT_EQ(got, want);
+}
+
+TEST(RowVariants, RgbToRgb) {
+    std::mt19937 random(1);
+    for (int s = 0; s < kRgbFormatCount; ++s) {
+        for (int d = 0; d < kRgbFormatCount; ++d) {
+            const RgbToRgbShape shape{kRgbLayouts[s], kRgbLayouts[d]};
+            const RgbToRgbRow fast = select_rgb_to_rgb_row(s, d);
+            for (int width : kWidths) {
+                SCOPED_TRACE(std::to_string(s) + " to " + std::to_string(d) + ", width " + std::to_string(width));
+                const std::vector<uint8_t> in = random_bytes(random, width * shape.src.bytesPerPixel);
+                expect_same_bytes(width * shape.dst.bytesPerPixel, [&](bool reference, uint8_t* out) {
+                    (reference ? rgb_to_rgb_row_reference : fast)(in.data(), out, width, shape);
+                });
+            }
+        }
+    }
+}
+
+TEST(RowVariants, RgbToLumaAndChroma) {
+    std::mt19937 random(2);
+    for (int s = 0; s < kRgbFormatCount; ++s) {
+        for (int step : {1, 2, 4}) {
+            const RgbToYuvShape shape{kRgbLayouts[s], step, step};
+            for (int width : kWidths) {
+                SCOPED_TRACE(std::to_string(s) + ", step " + std::to_string(step) + ", width " + std::to_string(width));
+                const std::vector<uint8_t> in = random_bytes(random, width * shape.src.bytesPerPixel);
+                if (step != 4) {
+                    const RgbToLumaRow fast = select_rgb_to_luma_row(s, step);
+                    expect_same_bytes(width * step, [&](bool reference, uint8_t* out) {
+                        (reference ? rgb_to_luma_row_reference : fast)(in.data(), out, width, shape);
+                    });
+                }
+                const RgbToChromaRow fast = select_rgb_to_chroma_row(s, step);
+                const int pairs = width / 2;
+                expect_same_bytes(2 * pairs * step, [&](bool reference, uint8_t* out) {
+                    (reference ? rgb_to_chroma_row_reference : fast)(in.data(), out, out + pairs * step, pairs,
+                                                                     shape);
+                });
+            }
+        }
+    }
+}
+
+TEST(RowVariants, YuvToRgb) {
+    struct Source {
+        int lumaStep, chromaStep, rows;
+    };
+    std::mt19937 random(3);
+    for (int d = 0; d < kRgbFormatCount; ++d) {
+        for (Source source : {Source{1, 1, 2}, Source{1, 2, 2}, Source{2, 4, 1}}) {
+            const YuvToRgbShape shape{source.lumaStep, source.chromaStep, source.rows, kRgbLayouts[d]};
+            const YuvToRgbRow fast = select_yuv_to_rgb_row(d, source.lumaStep, source.chromaStep, source.rows);
+            for (int width : kWidths) {
+                if (width % 2 != 0) continue;
+                SCOPED_TRACE(std::to_string(d) + ", chroma step " + std::to_string(source.chromaStep) + ", width " +
+                             std::to_string(width));
+                const std::vector<uint8_t> luma = random_bytes(random, 2 * width * source.lumaStep);
+                std::vector<uint8_t> u = random_bytes(random, width / 2 * source.chromaStep);
+                std::vector<uint8_t> v = random_bytes(random, width / 2 * source.chromaStep);
+                if (width >= 4) {
+                    // The one chroma pair whose pixels take the double path.
+                    u[source.chromaStep] = 28;
+                    v[source.chromaStep] = 228;
+                }
+                const size_t rowBytes = width * shape.dst.bytesPerPixel;
+                expect_same_bytes(2 * rowBytes, [&](bool reference, uint8_t* out) {
+                    const uint8_t* y1 = source.rows == 2 ? luma.data() + width : nullptr;
+                    uint8_t* d1 = source.rows == 2 ? out + rowBytes : nullptr;
+                    (reference ? yuv_to_rgb_row_reference : fast)(luma.data(), y1, u.data(), v.data(), out, d1,
+                                                                  width, shape);
+                });
+            }
+        }
+    }
+}
+
+TEST(RowVariants, GreyToRgb) {
+    std::mt19937 random(4);
+    for (int d = 0; d < kRgbFormatCount; ++d) {
+        const GreyToRgbRow fast = select_grey_to_rgb_row(d);
+        for (int width : kWidths) {
+            SCOPED_TRACE(std::to_string(d) + ", width " + std::to_string(width));
+            const std::vector<uint8_t> luma = random_bytes(random, width);
+            expect_same_bytes(width * kRgbLayouts[d].bytesPerPixel, [&](bool reference, uint8_t* out) {
+                (reference ? grey_to_rgb_row_reference : fast)(luma.data(), out, width, kRgbLayouts[d]);
+            });
+        }
+    }
+}
+
+TEST(RowVariants, SamplesAndChromaBetweenSteps) {
+    std::mt19937 random(5);
+    for (int from : {1, 2, 4}) {
+        for (int to : {1, 2, 4}) {
+            for (int count : kWidths) {
+                SCOPED_TRACE(std::to_string(from) + " to " + std::to_string(to) + ", count " + std::to_string(count));
+                const std::vector<uint8_t> in = random_bytes(random, count * from + 1);
+                if (from != 4 && to != 4) {
+                    const SampleRow fast = select_sample_row(from, to);
+                    expect_same_bytes(count * to, [&](bool reference, uint8_t* out) {
+                        (reference ? sample_row_reference : fast)(in.data(), from, out, to, count);
+                    });
+                }
+                const ChromaRow fast = select_chroma_row(from, to);
+                // V before U on the source side, U before V on the other.
+                expect_same_bytes(2 * count * to, [&](bool reference, uint8_t* out) {
+                    (reference ? chroma_row_reference : fast)(in.data() + 1, in.data(), from, out, out + count * to,
+                                                              to, count);
+                });
+            }
+        }
+    }
+}
+
+}  // namespace
