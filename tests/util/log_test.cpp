@@ -120,16 +120,4 @@ TEST(LogHook, EveryMessageGoesThroughTheCurrentHook) {
     EXPECT_EQ(system_log.next(), "");
 }
 
-TEST(FailureReport, NamesEveryStatus) {
-    EXPECT_STREQ(qk::status_name(QK_ERROR_UNKNOWN), "QK_ERROR_UNKNOWN");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_NULL_PARAM), "QK_ERROR_NULL_PARAM");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_INVALID_PARAM), "QK_ERROR_INVALID_PARAM");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_INVALID_SIZE), "QK_ERROR_INVALID_SIZE");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_ALLOC_FAILED), "QK_ERROR_ALLOC_FAILED");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_UNSUPPORTED), "QK_ERROR_UNSUPPORTED");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_IO_FAILED), "QK_ERROR_IO_FAILED");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_CODEC_FAILED), "QK_ERROR_CODEC_FAILED");
-    EXPECT_STREQ(qk::status_name(QK_ERROR_NOT_IMPLEMENTED), "QK_ERROR_NOT_IMPLEMENTED");
-}
-
 }  // namespace
