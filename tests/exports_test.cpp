@@ -40,6 +40,10 @@ const std::set<std::string> kDocumented = {
     "QKImage_clone",
     "QKImage_cloneHeader",
     "QKImage_wrap",
+    "QKImage_rotate",
+    "QKImage_scale",
+    "QKImage_crop",
+    "QKImage_drawImage",
 };
 
 // Names of the defined, globally visible entries of an ELF64 file's dynamic
