@@ -1,0 +1,142 @@
+// Geometry on 4000x3000 frames: quarter and half turns, scaling, cropping
+// and drawing. Yardsticks: BM_Memcpy in image_bench.cpp (a quarter turn
+// should stay within three times two frame copies; crop and draw should run
+// at memcpy speed per row).
+#include <benchmark/benchmark.h>
+#include <string.h>
+
+#include "qkcore/qk_image.h"
+#include "qkcore/qk_log.h"
+
+namespace {
+
+constexpr int32_t kWidth = 4000;
+constexpr int32_t kHeight = 3000;
+
+int quiet_log(int, ...) { return 0; }
+
+// Silences the per-call parameter messages for the benchmark's duration.
+class QuietLog {
+public:
+    QuietLog() : saved_(HX_LogMsg) { HX_LogMsg = quiet_log; }
+    ~QuietLog() { HX_LogMsg = saved_; }
+
+private:
+    QKLogFn saved_;
+};
+
+QKImage* make_frame(int32_t width, int32_t height, uint32_t format) {
+    QKImage* image = QKImage_createNew(width, height, format);
+    for (uint64_t i = 0; i < image->size; ++i) image->data[i] = static_cast<uint8_t>(i * 7 + 3);
+    if (format == QK_FORMAT_RGBA) {
+        for (uint64_t i = 3; i < image->size; i += 4) image->data[i] = 255;  // opaque: the camera case
+    }
+    return image;
+}
+
+void set_counters(benchmark::State& state, int64_t pixels) {
+    state.counters["Mpixel/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * pixels / 1e6,
+                                                    benchmark::Counter::kIsRate);
+}
+
+void BM_Rotate(benchmark::State& state, uint32_t format, int32_t angle) {
+    QuietLog quiet;
+    QKImage* image = make_frame(kWidth, kHeight, format);
+    for (auto _ : state) {
+        const int32_t status = QKImage_rotate(image, angle);
+        if (status != QK_OK) {
+            state.SkipWithError("QKImage_rotate failed");
+            break;
+        }
+        benchmark::DoNotOptimize(image->data);
+        benchmark::ClobberMemory();
+    }
+    set_counters(state, int64_t{kWidth} * kHeight);
+    QKImage_destroy(image);
+}
+BENCHMARK_CAPTURE(BM_Rotate, rgba_90, QK_FORMAT_RGBA, 90)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Rotate, rgba_180, QK_FORMAT_RGBA, 180)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Rotate, rgba_270, QK_FORMAT_RGBA, 270)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Rotate, nv21_90, QK_FORMAT_NV21, 90)->Unit(benchmark::kMillisecond);
+
+// The destination's buffer exists before timing: the allocation is the
+// caller's, not the resampling's.
+void BM_Scale(benchmark::State& state, int32_t width, int32_t height) {
+    QuietLog quiet;
+    QKImage* source = make_frame(kWidth, kHeight, QK_FORMAT_RGBA);
+    QKImage* target = QKImage_createNew(width, height, QK_FORMAT_RGBA);
+    memset(target->data, 0, target->size);
+    for (auto _ : state) {
+        if (QKImage_scale(source, target) != QK_OK) {
+            state.SkipWithError("QKImage_scale failed");
+            break;
+        }
+        benchmark::DoNotOptimize(target->data);
+        benchmark::ClobberMemory();
+    }
+    set_counters(state, int64_t{width} * height);
+    QKImage_destroy(target);
+    QKImage_destroy(source);
+}
+BENCHMARK_CAPTURE(BM_Scale, rgba_half, kWidth / 2, kHeight / 2)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Scale, rgba_double, kWidth * 2, kHeight * 2)->Unit(benchmark::kMillisecond);
+
+// A centred half-size rectangle, into a destination that has its buffer.
+void BM_Crop(benchmark::State& state, uint32_t format) {
+    QKImage* source = make_frame(kWidth, kHeight, format);
+    QKImage* target = QKImage_createNew(kWidth / 2, kHeight / 2, format);
+    memset(target->data, 0, target->size);
+    for (auto _ : state) {
+        if (QKImage_crop(source, target, kWidth / 4, kHeight / 4) != QK_OK) {
+            state.SkipWithError("QKImage_crop failed");
+            break;
+        }
+        benchmark::DoNotOptimize(target->data);
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * target->size));
+    set_counters(state, int64_t{kWidth / 2} * (kHeight / 2));
+    QKImage_destroy(target);
+    QKImage_destroy(source);
+}
+BENCHMARK_CAPTURE(BM_Crop, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
+BENCHMARK_CAPTURE(BM_Crop, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+
+// A half-size picture drawn into the centre of a frame.
+void BM_Draw(benchmark::State& state, uint32_t format) {
+    QKImage* picture = make_frame(kWidth / 2, kHeight / 2, format);
+    QKImage* frame = make_frame(kWidth, kHeight, format);
+    for (auto _ : state) {
+        if (QKImage_drawImage(picture, frame, kWidth / 4, kHeight / 4) != QK_OK) {
+            state.SkipWithError("QKImage_drawImage failed");
+            break;
+        }
+        benchmark::DoNotOptimize(frame->data);
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * picture->size));
+    set_counters(state, int64_t{kWidth / 2} * (kHeight / 2));
+    QKImage_destroy(frame);
+    QKImage_destroy(picture);
+}
+BENCHMARK_CAPTURE(BM_Draw, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
+BENCHMARK_CAPTURE(BM_Draw, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+
+// Memory yardstick for the crop and draw rows: the same bytes as one block.
+void BM_MemcpyHalfFrame(benchmark::State& state, uint32_t format) {
+    const uint64_t bytes = QKImage_requiredSize(kWidth / 2, kHeight / 2, format);
+    QKImage* from = make_frame(kWidth / 2, kHeight / 2, format);
+    QKImage* to = make_frame(kWidth / 2, kHeight / 2, format);
+    for (auto _ : state) {
+        memcpy(to->data, from->data, bytes);
+        benchmark::DoNotOptimize(to->data);
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * bytes));
+    QKImage_destroy(to);
+    QKImage_destroy(from);
+}
+BENCHMARK_CAPTURE(BM_MemcpyHalfFrame, rgba, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
+BENCHMARK_CAPTURE(BM_MemcpyHalfFrame, nv12, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+
+}  // namespace
