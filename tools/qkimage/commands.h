@@ -4,5 +4,8 @@
 #define QKIMAGE_COMMANDS_H
 
 int cmd_formats(int argc, char** argv);
+int cmd_rotate(int argc, char** argv);
+int cmd_scale(int argc, char** argv);
+int cmd_crop(int argc, char** argv);
 
 #endif  // QKIMAGE_COMMANDS_H

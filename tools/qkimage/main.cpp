@@ -14,6 +14,12 @@ struct Command {
 
 const Command kCommands[] = {
     {"formats", cmd_formats, "formats WIDTHxHEIGHT          byte size of every format at that size"},
+    {"rotate", cmd_rotate, "rotate --size WxH --format FMT --angle DEGREES IN OUT\n"
+                           "                                turn a raw frame by a multiple of 90 degrees"},
+    {"scale", cmd_scale, "scale --size WxH --format RGBA --to WxH IN OUT\n"
+                         "                                resample a raw RGBA frame (nearest pixel)"},
+    {"crop", cmd_crop, "crop --size WxH --format FMT --at X,Y --to WxH IN OUT\n"
+                       "                                cut a rectangle out of a raw frame"},
 };
 
 int usage() {
