@@ -69,6 +69,12 @@ private:
 // Target pixels that no source pixel covers are left as they are.
 void draw_turned(const Bitmap& source, int quarter_turns, int32_t pivot_x, int32_t pivot_y, Bitmap& target);
 
+// Turns the bitmap half a turn about the integer pivot in place. The pixels
+// are those of drawing it turned onto a cleared bitmap of the same size
+// (pixels that nothing covers become transparent black), without a second
+// bitmap.
+void turn_half_in_place(Bitmap& bitmap, int32_t pivot_x, int32_t pivot_y);
+
 // Draws `source` scaled by the factors: target pixel (c, r) takes the source
 // pixel under its centre mapped back, ((c + 0.5) / scale_x, (r + 0.5) /
 // scale_y), clamped into the source. Factors must be positive (otherwise

@@ -97,7 +97,8 @@ TEST(Raster, DrawingBlendsSourceOver) {
 TEST(Raster, TurnsAboutAnIntegerPivot) {
     const struct {
         int32_t w, h, tw, th, px, py;
-    } shapes[] = {{4, 2, 4, 4, 2, 1}, {5, 3, 6, 6, 2, 2}, {3, 5, 5, 5, 1, 3}, {2, 2, 3, 3, 0, 0}, {4, 3, 4, 3, 2, 1}};
+    } shapes[] = {{4, 2, 4, 4, 2, 1}, {5, 3, 6, 6, 2, 2}, {3, 5, 5, 5, 1, 3}, {2, 2, 3, 3, 0, 0},
+                  {4, 3, 4, 3, 2, 1}, {8, 8, 8, 8, 4, 4}, {13, 9, 11, 14, 6, 5}};
     for (const auto& s : shapes) {
         for (int turns : {0, 1, 2, 3, -1, 6}) {
             SCOPED_TRACE(::testing::Message() << s.w << "x" << s.h << " pivot " << s.px << "," << s.py << " turns "
@@ -105,8 +106,13 @@ TEST(Raster, TurnsAboutAnIntegerPivot) {
             Bitmap source, target;
             ASSERT_TRUE(source.allocate(s.w, s.h, false));
             ASSERT_TRUE(target.allocate(s.tw, s.th, /*cleared=*/true));
+            // Opaque in the top half, translucent below (blocks of either kind
+            // and mixed ones).
+            auto value = [&](int32_t i, int32_t j) {
+                return rgba(uint8_t(i), uint8_t(j), 7, j < s.h / 2 ? 255 : uint8_t(20 + i * 10 + j));
+            };
             for (int32_t j = 0; j < s.h; ++j) {
-                for (int32_t i = 0; i < s.w; ++i) set(source, i, j, rgba(uint8_t(i), uint8_t(j), 7, 255));
+                for (int32_t i = 0; i < s.w; ++i) set(source, i, j, value(i, j));
             }
             qk::platform::draw_turned(source, turns, s.px, s.py, target);
 
@@ -123,7 +129,7 @@ TEST(Raster, TurnsAboutAnIntegerPivot) {
                     }
                     const int64_t tx = (x + 2 * s.px - 1) / 2, ty = (y + 2 * s.py - 1) / 2;
                     if (tx >= 0 && tx < s.tw && ty >= 0 && ty < s.th) {
-                        expected[ty * s.tw + tx] = rgba(uint8_t(i), uint8_t(j), 7, 255);
+                        expected[ty * s.tw + tx] = value(i, j);
                     }
                 }
             }
@@ -131,6 +137,28 @@ TEST(Raster, TurnsAboutAnIntegerPivot) {
                 for (int32_t x = 0; x < s.tw; ++x) ASSERT_EQ(pixel(target, x, y), expected[y * s.tw + x]) << x << "," << y;
             }
         }
+    }
+}
+
+// In place, a half turn gives what drawing it turned onto a cleared bitmap
+// gives, for any pivot.
+TEST(Raster, HalfTurnInPlace) {
+    const struct {
+        int32_t w, h, px, py;
+    } shapes[] = {{4, 2, 2, 1}, {5, 3, 2, 1}, {3, 5, 1, 2}, {1, 1, 0, 0}, {6, 4, 1, 3}, {6, 4, 5, 0}, {4, 4, 9, 2}};
+    for (const auto& s : shapes) {
+        SCOPED_TRACE(::testing::Message() << s.w << "x" << s.h << " pivot " << s.px << "," << s.py);
+        Bitmap source, drawn, turned;
+        ASSERT_TRUE(source.allocate(s.w, s.h, false));
+        ASSERT_TRUE(drawn.allocate(s.w, s.h, /*cleared=*/true));
+        ASSERT_TRUE(turned.allocate(s.w, s.h, false));
+        for (int32_t j = 0; j < s.h; ++j) {
+            for (int32_t i = 0; i < s.w; ++i) set(source, i, j, rgba(uint8_t(i), uint8_t(j), 9, uint8_t(i * 40)));
+        }
+        qk::platform::draw_turned(source, 2, s.px, s.py, drawn);
+        ASSERT_TRUE(source.copy_to(turned.pixels(), turned.byte_count()));
+        qk::platform::turn_half_in_place(turned, s.px, s.py);
+        EXPECT_EQ(0, memcmp(turned.pixels(), drawn.pixels(), drawn.byte_count()));
     }
 }
 
