@@ -5,6 +5,7 @@
 #include <benchmark/benchmark.h>
 #include <string.h>
 
+#include "platform/raster.h"
 #include "qkcore/qk_image.h"
 #include "qkcore/qk_log.h"
 
@@ -58,6 +59,40 @@ BENCHMARK_CAPTURE(BM_Rotate, rgba_90, QK_FORMAT_RGBA, 90)->Unit(benchmark::kMill
 BENCHMARK_CAPTURE(BM_Rotate, rgba_180, QK_FORMAT_RGBA, 180)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(BM_Rotate, rgba_270, QK_FORMAT_RGBA, 270)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(BM_Rotate, nv21_90, QK_FORMAT_NV21, 90)->Unit(benchmark::kMillisecond);
+
+// The two halves of a quarter turn's cost, for comparison with BM_Rotate: a
+// fresh frame-sized bitmap (mapped and first touched), and the turned
+// drawing alone between bitmaps that already exist.
+void BM_RasterFreshBitmap(benchmark::State& state) {
+    for (auto _ : state) {
+        qk::platform::Bitmap bitmap;
+        if (!bitmap.allocate(kHeight, kWidth, /*cleared=*/true)) {
+            state.SkipWithError("no memory");
+            break;
+        }
+        for (uint64_t i = 0; i < bitmap.byte_count(); i += 4096) bitmap.pixels()[i] = 1;
+        benchmark::DoNotOptimize(bitmap.pixels());
+    }
+}
+BENCHMARK(BM_RasterFreshBitmap)->Unit(benchmark::kMillisecond);
+
+// The library's angle 90 is three clockwise quarter turns about (W/2, W/2);
+// its angle 270 one about (H/2, H/2).
+void BM_RasterQuarterTurnDraw(benchmark::State& state, int quarter_turns, int32_t pivot) {
+    QKImage* image = make_frame(kWidth, kHeight, QK_FORMAT_RGBA);
+    qk::platform::Bitmap source, target;
+    source.borrow(image->data, kWidth, kHeight);
+    target.allocate(kHeight, kWidth, /*cleared=*/true);
+    for (auto _ : state) {
+        qk::platform::draw_turned(source, quarter_turns, pivot, pivot, target);
+        benchmark::DoNotOptimize(target.pixels());
+        benchmark::ClobberMemory();
+    }
+    set_counters(state, int64_t{kWidth} * kHeight);
+    QKImage_destroy(image);
+}
+BENCHMARK_CAPTURE(BM_RasterQuarterTurnDraw, angle_90, 3, kWidth / 2)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_RasterQuarterTurnDraw, angle_270, 1, kHeight / 2)->Unit(benchmark::kMillisecond);
 
 // The destination's buffer exists before timing: the allocation is the
 // caller's, not the resampling's.

@@ -41,6 +41,11 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
 
     platform::Bitmap source;
     source.borrow(image->data, width, height);
+    // A half turn exchanges pixel pairs: no second bitmap needed.
+    if (orient == 2) {
+        platform::turn_half_in_place(source, pivot_x, pivot_y);
+        return QK_OK;
+    }
     // Cleared, so that the uncovered row or column ends up transparent black
     // and translucent pixels arrive unchanged.
     platform::Bitmap output;
