@@ -1,5 +1,3 @@
-#include <stdio.h>
-
 #include "args.h"
 #include "commands.h"
 #include "frame_io.h"
@@ -16,17 +14,8 @@ int cmd_crop(int argc, char** argv) {
     if (!parse_size(args.options["--to"].c_str(), &width, &height)) {
         return usage_error(command, "bad --to '" + args.options["--to"] + "' (want WIDTHxHEIGHT)");
     }
-    QKImage* source = read_frame(command, args.input, args.width, args.height, args.format);
-    if (source == nullptr) return 1;
-    QKImage* target = QKImage_createEmpty(width, height, args.format);
-    const int32_t status = QKImage_crop(source, target, x, y);
-    int exit_status = 0;
-    if (status != QK_OK) {
-        exit_status = operation_failed(command, status);
-    } else if (!write_frame(command, args.output, *target)) {
-        exit_status = 1;
-    }
-    QKImage_destroy(target);
-    QKImage_destroy(source);
-    return exit_status;
+    ImageHandle source = read_frame(command, args.input, args.width, args.height, args.format);
+    if (!source) return 1;
+    ImageHandle target = hold(QKImage_createEmpty(width, height, args.format));
+    return finish(command, QKImage_crop(source.get(), target.get(), x, y), args.output, target.get());
 }

@@ -82,32 +82,29 @@ bool parse_frame_args(const FrameCommand& command, int argc, char** argv, FrameA
     return true;
 }
 
-QKImage* read_frame(const FrameCommand& command, const std::string& path, int32_t width, int32_t height,
-                    uint32_t format) {
+ImageHandle read_frame(const FrameCommand& command, const std::string& path, int32_t width, int32_t height,
+                       uint32_t format) {
     const uint64_t expected = QKImage_requiredSize(width, height, format);
     if (expected == 0) {
         fprintf(stderr, "qkimage %s: a %dx%d %s frame has no raw size\n", command.name, width, height,
                 format_name(format).c_str());
-        return nullptr;
+        return hold(nullptr);
     }
     FILE* file = fopen(path.c_str(), "rb");
     if (file == nullptr) {
         fprintf(stderr, "qkimage %s: cannot open '%s'\n", command.name, path.c_str());
-        return nullptr;
+        return hold(nullptr);
     }
-    QKImage* image = QKImage_createNew(width, height, format);
-    size_t got = image != nullptr ? fread(image->data, 1, expected, file) : 0;
+    ImageHandle image = hold(QKImage_createNew(width, height, format));
+    const size_t got = image ? fread(image->data, 1, expected, file) : 0;
     const bool longer = fgetc(file) != EOF;
     fclose(file);
-    if (image == nullptr) {
+    if (!image) {
         fprintf(stderr, "qkimage %s: no memory for a %dx%d frame\n", command.name, width, height);
-        return nullptr;
-    }
-    if (got != expected || longer) {
+    } else if (got != expected || longer) {
         fprintf(stderr, "qkimage %s: '%s' is not a %dx%d %s frame of %llu bytes\n", command.name, path.c_str(), width,
                 height, format_name(format).c_str(), static_cast<unsigned long long>(expected));
-        QKImage_destroy(image);
-        return nullptr;
+        image.reset();
     }
     return image;
 }
@@ -121,7 +118,10 @@ bool write_frame(const FrameCommand& command, const std::string& path, const QKI
     return written;
 }
 
-int operation_failed(const FrameCommand& command, int32_t status) {
-    fprintf(stderr, "qkimage %s: the operation failed with status %d\n", command.name, status);
-    return 1;
+int finish(const FrameCommand& command, int32_t status, const std::string& path, const QKImage* result) {
+    if (status != QK_OK) {
+        fprintf(stderr, "qkimage %s: the operation failed with status %d\n", command.name, status);
+        return 1;
+    }
+    return write_frame(command, path, *result) ? 0 : 1;
 }

@@ -8,6 +8,7 @@
 #include <stdint.h>
 
 #include <map>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -35,15 +36,21 @@ bool parse_frame_args(const FrameCommand& command, int argc, char** argv, FrameA
 // Prints "qkimage NAME: message" and the usage; returns the exit status 2.
 int usage_error(const FrameCommand& command, const std::string& message);
 
+// An image released with QKImage_destroy when it goes out of scope.
+using ImageHandle = std::unique_ptr<QKImage, decltype(&QKImage_destroy)>;
+inline ImageHandle hold(QKImage* image) { return ImageHandle(image, &QKImage_destroy); }
+
 // Reads a raw frame of the given size and format into a new image, or prints
 // why it could not and returns null.
-QKImage* read_frame(const FrameCommand& command, const std::string& path, int32_t width, int32_t height,
+ImageHandle read_frame(const FrameCommand& command, const std::string& path, int32_t width, int32_t height,
                     uint32_t format);
 // Writes the image's pixels (its format's size at its width and height).
 bool write_frame(const FrameCommand& command, const std::string& path, const QKImage& image);
 
-// Reports a status the library returned; returns the exit status 1.
-int operation_failed(const FrameCommand& command, int32_t status);
+// The exit status of a command whose operation returned `status`: 0 once the
+// result is written to `path`; 1, with a message, when the operation failed
+// or the file could not be written.
+int finish(const FrameCommand& command, int32_t status, const std::string& path, const QKImage* result);
 
 // "X,Y" with any signed 32-bit values.
 bool parse_point(const char* text, int32_t* x, int32_t* y);
