@@ -43,7 +43,7 @@ inline ImageHandle hold(QKImage* image) { return ImageHandle(image, &QKImage_des
 // Reads a raw frame of the given size and format into a new image, or prints
 // why it could not and returns null.
 ImageHandle read_frame(const FrameCommand& command, const std::string& path, int32_t width, int32_t height,
-                    uint32_t format);
+                       uint32_t format);
 // Writes the image's pixels (its format's size at its width and height).
 bool write_frame(const FrameCommand& command, const std::string& path, const QKImage& image);
 
