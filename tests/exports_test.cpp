@@ -59,6 +59,10 @@ const std::set<std::string> kDocumented = {
     "QKImage_copyAndConvert",
     // Converters.
     "_Z7csc_runPK7QKImagePS_",          // csc_run(const QKImage*, QKImage*)
+    "QKImage_rotate",
+    "QKImage_scale",
+    "QKImage_crop",
+    "QKImage_drawImage",
 };
 
 // Names of the defined, globally visible entries of an ELF64 file's dynamic

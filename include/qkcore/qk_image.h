@@ -97,6 +97,27 @@ QK_API int32_t QKImage_convert(const QKImage* src, QKImage* dst);
 // A new image of the source's size in `format`, converted from the source;
 // null on any failure. The caller releases it with QKImage_destroy.
 QK_API QKImage* QKImage_copyAndConvert(const QKImage* src, uint32_t format);
+// Geometry.
+
+// Turns the image in place by `angle` degrees, any multiple of 90 (negative
+// and beyond a full turn included); positive angles turn counter-clockwise
+// as displayed. A quarter or three-quarter turn exchanges width and height.
+// The buffer is rewritten, never reallocated. RGBA pixels are turned
+// directly; other formats go through a temporary RGBA copy. An odd dimension
+// shifts the picture by one pixel: the uncovered row or column becomes
+// transparent black (RGBA).
+QK_API int32_t QKImage_rotate(QKImage* image, int32_t angle);
+// Resamples an RGBA source to the destination's width and height (nearest
+// pixel). A destination without buffer gets one of width x height x 4 bytes.
+QK_API int32_t QKImage_scale(const QKImage* src, QKImage* dst);
+// Copies the rectangle at (x, y) of the source, of the destination's width
+// and height, into the destination (same format: packed RGB, or 4:2:0 with
+// even coordinates and sizes). A destination without buffer gets one.
+QK_API int32_t QKImage_crop(const QKImage* src, QKImage* dst, int32_t x, int32_t y);
+// Overwrites the destination with the source placed at (x, y), clipped to
+// the destination; offsets may be negative. Same format on both sides:
+// packed RGB, or 4:2:0 with even offsets and sizes. Nothing is blended.
+QK_API int32_t QKImage_drawImage(const QKImage* src, QKImage* dst, int32_t x, int32_t y);
 
 }  // extern "C"
 

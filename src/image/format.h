@@ -38,6 +38,24 @@ inline uint64_t chroma_base(const QKImage& image) {
     return chroma_base(image.chromaOffset, image.width, image.height);
 }
 
+// Where the U and V samples of a 4:2:0 image start: NV12 and NV21 interleave
+// them from the chroma base, YV12 and YUVP hold two planes of
+// (width x height) / 4 bytes each.
+struct ChromaStart {
+    uint64_t u;
+    uint64_t v;
+};
+inline ChromaStart chroma_start(const QKImage& image) {
+    const uint64_t base = chroma_base(image);
+    const uint64_t plane = static_cast<uint64_t>(static_cast<int64_t>(image.width) * image.height / 4);
+    switch (image.format) {
+        case QK_FORMAT_NV12: return {base, base + 1};
+        case QK_FORMAT_NV21: return {base + 1, base};
+        case QK_FORMAT_YV12: return {base + plane, base};
+        default: return {base, base + plane};  // YUVP
+    }
+}
+
 }  // namespace qk
 
 #endif  // QKCORE_SRC_IMAGE_FORMAT_H

@@ -18,6 +18,12 @@ const Command kCommands[] = {
     {"convert", cmd_convert,
      "convert --size WxH --from FORMAT --to FORMAT IN OUT\n"
      "                                convert a raw frame file to another pixel format"},
+    {"rotate", cmd_rotate, "rotate --size WxH --format FMT --angle DEGREES IN OUT\n"
+                           "                                turn a raw frame by a multiple of 90 degrees"},
+    {"scale", cmd_scale, "scale --size WxH --format RGBA --to WxH IN OUT\n"
+                         "                                resample a raw RGBA frame (nearest pixel)"},
+    {"crop", cmd_crop, "crop --size WxH --format FMT --at X,Y --to WxH IN OUT\n"
+                       "                                cut a rectangle out of a raw frame"},
 };
 
 int usage() {

@@ -1,0 +1,187 @@
+// Geometry on 4000x3000 frames: quarter and half turns, scaling, cropping
+// and drawing. Yardsticks: BM_Memcpy in image_bench.cpp (a quarter turn
+// should stay within three times two frame copies) and BM_MemcpyRows below
+// (crop and draw should run at the speed of one memcpy per row).
+#include <benchmark/benchmark.h>
+#include <string.h>
+
+#include "platform/raster.h"
+#include "qkcore/qk_image.h"
+#include "qkcore/qk_log.h"
+
+namespace {
+
+constexpr int32_t kWidth = 4000;
+constexpr int32_t kHeight = 3000;
+
+int quiet_log(int, ...) { return 0; }
+
+// Silences the per-call parameter messages for the benchmark's duration.
+class QuietLog {
+public:
+    QuietLog() : saved_(HX_LogMsg) { HX_LogMsg = quiet_log; }
+    ~QuietLog() { HX_LogMsg = saved_; }
+
+private:
+    QKLogFn saved_;
+};
+
+QKImage* make_frame(int32_t width, int32_t height, uint32_t format) {
+    QKImage* image = QKImage_createNew(width, height, format);
+    for (uint64_t i = 0; i < image->size; ++i) image->data[i] = static_cast<uint8_t>(i * 7 + 3);
+    if (format == QK_FORMAT_RGBA) {
+        for (uint64_t i = 3; i < image->size; i += 4) image->data[i] = 255;  // opaque: the camera case
+    }
+    return image;
+}
+
+void set_counters(benchmark::State& state, int64_t pixels) {
+    state.counters["Mpixel/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * pixels / 1e6,
+                                                    benchmark::Counter::kIsRate);
+}
+
+void BM_Rotate(benchmark::State& state, uint32_t format, int32_t angle) {
+    QuietLog quiet;
+    QKImage* image = make_frame(kWidth, kHeight, format);
+    for (auto _ : state) {
+        const int32_t status = QKImage_rotate(image, angle);
+        if (status != QK_OK) {
+            state.SkipWithError("QKImage_rotate failed");
+            break;
+        }
+        benchmark::DoNotOptimize(image->data);
+        benchmark::ClobberMemory();
+    }
+    set_counters(state, int64_t{kWidth} * kHeight);
+    QKImage_destroy(image);
+}
+BENCHMARK_CAPTURE(BM_Rotate, rgba_90, QK_FORMAT_RGBA, 90)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Rotate, rgba_180, QK_FORMAT_RGBA, 180)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Rotate, rgba_270, QK_FORMAT_RGBA, 270)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Rotate, nv21_90, QK_FORMAT_NV21, 90)->Unit(benchmark::kMillisecond);
+
+// The two halves of a quarter turn's cost, for comparison with BM_Rotate: a
+// fresh frame-sized bitmap (mapped and first touched), and the turned
+// drawing alone between bitmaps that already exist.
+void BM_RasterFreshBitmap(benchmark::State& state) {
+    for (auto _ : state) {
+        qk::platform::Bitmap bitmap;
+        if (!bitmap.allocate(kHeight, kWidth, /*cleared=*/true)) {
+            state.SkipWithError("no memory");
+            break;
+        }
+        for (uint64_t i = 0; i < bitmap.byte_count(); i += 4096) bitmap.pixels()[i] = 1;
+        benchmark::DoNotOptimize(bitmap.pixels());
+    }
+}
+BENCHMARK(BM_RasterFreshBitmap)->Unit(benchmark::kMillisecond);
+
+// The library's angle 90 is three clockwise quarter turns about (W/2, W/2);
+// its angle 270 one about (H/2, H/2).
+void BM_RasterQuarterTurnDraw(benchmark::State& state, int quarter_turns, int32_t pivot) {
+    QKImage* image = make_frame(kWidth, kHeight, QK_FORMAT_RGBA);
+    qk::platform::Bitmap source, target;
+    source.borrow(image->data, kWidth, kHeight);
+    target.allocate(kHeight, kWidth, /*cleared=*/true);
+    for (auto _ : state) {
+        qk::platform::draw_turned(source, quarter_turns, pivot, pivot, target);
+        benchmark::DoNotOptimize(target.pixels());
+        benchmark::ClobberMemory();
+    }
+    set_counters(state, int64_t{kWidth} * kHeight);
+    QKImage_destroy(image);
+}
+BENCHMARK_CAPTURE(BM_RasterQuarterTurnDraw, angle_90, 3, kWidth / 2)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_RasterQuarterTurnDraw, angle_270, 1, kHeight / 2)->Unit(benchmark::kMillisecond);
+
+// The destination's buffer exists before timing: the allocation is the
+// caller's, not the resampling's.
+void BM_Scale(benchmark::State& state, int32_t width, int32_t height) {
+    QuietLog quiet;
+    QKImage* source = make_frame(kWidth, kHeight, QK_FORMAT_RGBA);
+    QKImage* target = QKImage_createNew(width, height, QK_FORMAT_RGBA);
+    memset(target->data, 0, target->size);
+    for (auto _ : state) {
+        if (QKImage_scale(source, target) != QK_OK) {
+            state.SkipWithError("QKImage_scale failed");
+            break;
+        }
+        benchmark::DoNotOptimize(target->data);
+        benchmark::ClobberMemory();
+    }
+    set_counters(state, int64_t{width} * height);
+    QKImage_destroy(target);
+    QKImage_destroy(source);
+}
+BENCHMARK_CAPTURE(BM_Scale, rgba_half, kWidth / 2, kHeight / 2)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Scale, rgba_double, kWidth * 2, kHeight * 2)->Unit(benchmark::kMillisecond);
+
+// A centred half-size rectangle, into a destination that has its buffer.
+void BM_Crop(benchmark::State& state, uint32_t format) {
+    QKImage* source = make_frame(kWidth, kHeight, format);
+    QKImage* target = QKImage_createNew(kWidth / 2, kHeight / 2, format);
+    memset(target->data, 0, target->size);
+    for (auto _ : state) {
+        if (QKImage_crop(source, target, kWidth / 4, kHeight / 4) != QK_OK) {
+            state.SkipWithError("QKImage_crop failed");
+            break;
+        }
+        benchmark::DoNotOptimize(target->data);
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * target->size));
+    set_counters(state, int64_t{kWidth / 2} * (kHeight / 2));
+    QKImage_destroy(target);
+    QKImage_destroy(source);
+}
+BENCHMARK_CAPTURE(BM_Crop, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
+BENCHMARK_CAPTURE(BM_Crop, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+
+// A half-size picture drawn into the centre of a frame.
+void BM_Draw(benchmark::State& state, uint32_t format) {
+    QKImage* picture = make_frame(kWidth / 2, kHeight / 2, format);
+    QKImage* frame = make_frame(kWidth, kHeight, format);
+    for (auto _ : state) {
+        if (QKImage_drawImage(picture, frame, kWidth / 4, kHeight / 4) != QK_OK) {
+            state.SkipWithError("QKImage_drawImage failed");
+            break;
+        }
+        benchmark::DoNotOptimize(frame->data);
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * picture->size));
+    set_counters(state, int64_t{kWidth / 2} * (kHeight / 2));
+    QKImage_destroy(frame);
+    QKImage_destroy(picture);
+}
+BENCHMARK_CAPTURE(BM_Draw, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
+BENCHMARK_CAPTURE(BM_Draw, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+
+// Yardstick for crop and draw: the rows of the centred half-size rectangle
+// copied with one plain memcpy each (luma, then chroma rows for NV12).
+void BM_MemcpyRows(benchmark::State& state, uint32_t format) {
+    QKImage* frame = make_frame(kWidth, kHeight, format);
+    QKImage* part = make_frame(kWidth / 2, kHeight / 2, format);
+    const bool rgba = format == QK_FORMAT_RGBA;
+    const size_t unit = rgba ? 4 : 1;
+    const size_t src_stride = kWidth * unit, dst_stride = kWidth / 2 * unit;
+    auto copy_rows = [&](const uint8_t* src, uint8_t* dst, int rows) {
+        for (int r = 0; r < rows; ++r) memcpy(dst + r * dst_stride, src + r * src_stride, dst_stride);
+    };
+    for (auto _ : state) {
+        copy_rows(frame->data + (kHeight / 4 * kWidth + kWidth / 4) * unit, part->data, kHeight / 2);
+        if (!rgba) {
+            copy_rows(frame->data + kWidth * kHeight + kHeight / 8 * kWidth + kWidth / 4,
+                      part->data + kWidth / 2 * (kHeight / 2), kHeight / 4);
+        }
+        benchmark::DoNotOptimize(part->data);
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * part->size));
+    QKImage_destroy(part);
+    QKImage_destroy(frame);
+}
+BENCHMARK_CAPTURE(BM_MemcpyRows, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
+BENCHMARK_CAPTURE(BM_MemcpyRows, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+
+}  // namespace

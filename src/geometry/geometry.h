@@ -1,0 +1,45 @@
+// Internal routines shared by the geometry operations (rotation, scaling,
+// cropping, drawing).
+#ifndef QKCORE_SRC_GEOMETRY_GEOMETRY_H
+#define QKCORE_SRC_GEOMETRY_GEOMETRY_H
+
+#include <stdint.h>
+
+#include "qkcore/qk_image.h"
+
+namespace qk {
+
+// Turns an RGBA image that has a buffer in place by `angle` degrees (a
+// multiple of 90); QKImage_rotate's RGBA path. QK_OK, or a failure status
+// with its report and the image unchanged.
+int32_t rotate_rgba(QKImage* image, int32_t angle);
+
+// True when the image's buffer holds the whole picture that its width,
+// height and format describe. A recorded size is checked against everything
+// the picture occupies, 4:2:0 chroma at a separate chromaOffset included;
+// without a recorded size the rule size is all there is to go by, and a
+// chromaOffset past the luma plane is the caller's promise. Images without a
+// size rule (a dimension below 1, encoded or unknown formats) pass: the
+// operations refuse them on their own terms.
+bool buffer_holds_image(const QKImage& image);
+
+// A rectangle of `cols` x `lines` pixels at (src_x, src_y) of one image and
+// (dst_x, dst_y) of another.
+struct Region {
+    int32_t src_x;
+    int32_t src_y;
+    int32_t dst_x;
+    int32_t dst_y;
+    int32_t cols;
+    int32_t lines;
+};
+
+// Copies the region between two images of one packed RGB or 4:2:0 format,
+// one block copy per row (luma, chroma and plane rows for 4:2:0, whose
+// coordinates and sizes must be even), each image with its own chroma base.
+// The caller has checked that the region lies inside both images.
+void copy_region(const QKImage& src, QKImage& dst, const Region& region);
+
+}  // namespace qk
+
+#endif  // QKCORE_SRC_GEOMETRY_GEOMETRY_H

@@ -1,0 +1,86 @@
+#include <stdint.h>
+
+#include "geometry/geometry.h"
+#include "image/status.h"
+#include "platform/raster.h"
+#include "qkcore/qk_image.h"
+#include "util/log.h"
+
+namespace qk {
+
+int32_t rotate_rgba(QKImage* image, int32_t angle) {
+    const int32_t width = image->width;
+    const int32_t height = image->height;
+    // Counter-clockwise quarter turns as displayed, 0..3.
+    const int orient = ((angle / 90) % 4 + 4) % 4;
+    const bool exchanged = orient % 2 == 1;
+    const int32_t out_width = exchanged ? height : width;
+    const int32_t out_height = exchanged ? width : height;
+    // Integer pivots: for an odd dimension the turned picture lands one pixel
+    // short, and the far output row or column stays uncovered.
+    int32_t pivot_x = width / 2;
+    int32_t pivot_y = height / 2;
+    if (orient == 1) pivot_y = width / 2;
+    if (orient == 3) pivot_x = height / 2;
+    QK_LOG(QK_LOG_DEBUG,
+           "Rotation parameters: angle = %d, orient = %d, in w/h = %dx%d, out w/h = %dx%d, pivot = %d,%d", angle,
+           orient, width, height, out_width, out_height, pivot_x, pivot_y);
+
+    // The turned picture is written back over the whole buffer, so the buffer
+    // must be exactly one picture: a larger one would keep stale bytes past
+    // it, a smaller one cannot be read in full.
+    const uint64_t buffer_size = QKImage_size(image);
+    if (width < 1 || height < 1 ||
+        buffer_size != uint64_t{platform::kBitmapBytesPerPixel} * static_cast<uint64_t>(width) *
+                           static_cast<uint64_t>(height)) {
+        return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    }
+    // No turn: drawing onto a cleared bitmap and copying back would give the
+    // same bytes.
+    if (orient == 0) return QK_OK;
+
+    platform::Bitmap source;
+    source.borrow(image->data, width, height);
+    // A half turn exchanges pixel pairs: no second bitmap needed.
+    if (orient == 2) {
+        platform::turn_half_in_place(source, pivot_x, pivot_y);
+        return QK_OK;
+    }
+    // Cleared, so that the uncovered row or column ends up transparent black
+    // and translucent pixels arrive unchanged.
+    platform::Bitmap output;
+    if (!output.allocate(out_width, out_height, /*cleared=*/true)) return QK_FAIL(QK_ERROR_ALLOC_FAILED);
+    // The raster layer turns clockwise: the library's counter-clockwise angle
+    // is negated.
+    platform::draw_turned(source, -(angle / 90), pivot_x, pivot_y, output);
+    image->width = out_width;
+    image->height = out_height;
+    output.copy_to(image->data, buffer_size);
+    return QK_OK;
+}
+
+}  // namespace qk
+
+// ---- Images in other formats: turned through a temporary RGBA copy ----
+
+namespace {
+
+// Waits for the conversion entry (QKImage_convert there and back).
+int32_t rotate_through_rgba([[maybe_unused]] QKImage* image, [[maybe_unused]] int32_t angle) {
+    return QK_FAIL(QK_ERROR_UNSUPPORTED);
+}
+
+}  // namespace
+
+// ---- Entry point ----
+
+int32_t QKImage_rotate(QKImage* image, int32_t angle) {
+    if (image == nullptr || image->data == nullptr) return QK_FAIL(QK_ERROR_NULL_PARAM);
+    if (angle % 90 != 0) return QK_FAIL(QK_ERROR_INVALID_PARAM);
+    if (QKImage_size(image) == 0) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    if (image->format == QK_FORMAT_RGBA) return qk::rotate_rgba(image, angle);
+    QK_LOG(QK_LOG_WARN,
+           "Rotation is supported on RGBA images only for now: using temporary RGBA copy of this %dx%d '%4.4s' image",
+           image->width, image->height, QK_FOURCC_STR(image->format));
+    return rotate_through_rgba(image, angle);
+}

@@ -1,0 +1,87 @@
+// Our raster layer: RGBA bitmaps and the two ways geometry draws one bitmap
+// onto another (a turn by quarter turns about a pivot, and nearest-pixel
+// scaling). Pixels are 4 bytes, R G B A, premultiplied in meaning; nothing
+// here converts them. Drawing blends source-over onto the target, so onto a
+// cleared target every pixel arrives unchanged.
+//
+// The picture decoder and the PNG encoder of file loading and saving belong
+// here as well, working on these same bitmaps.
+#ifndef QKCORE_SRC_PLATFORM_RASTER_H
+#define QKCORE_SRC_PLATFORM_RASTER_H
+
+#include <stddef.h>
+#include <stdint.h>
+
+namespace qk {
+namespace platform {
+
+constexpr int kBitmapBytesPerPixel = 4;
+
+// width x height RGBA pixels with tight rows (width x 4 bytes), either
+// borrowed from the caller or owned. A bitmap without pixels is never drawn
+// on or read.
+class Bitmap {
+public:
+    Bitmap() = default;
+    ~Bitmap() { release(); }
+    Bitmap(const Bitmap&) = delete;
+    Bitmap& operator=(const Bitmap&) = delete;
+
+    // Uses the caller's memory, which must hold width x height x 4 bytes; it
+    // is never freed here. False, and no pixels, for a dimension below 1.
+    bool borrow(uint8_t* pixels, int32_t width, int32_t height);
+    // Gets memory of its own: uninitialised, or transparent black when
+    // `cleared` (cheaper than clearing afterwards: fresh pages are zero).
+    // False, and no pixels, for a dimension below 1, a size past the signed
+    // 32-bit byte counts of the library, or memory that cannot be had.
+    bool allocate(int32_t width, int32_t height, bool cleared);
+    // Forgets the pixels, freeing them when owned.
+    void release();
+
+    bool has_pixels() const { return pixels_ != nullptr; }
+    int32_t width() const { return width_; }
+    int32_t height() const { return height_; }
+    size_t row_bytes() const { return static_cast<size_t>(width_) * kBitmapBytesPerPixel; }
+    uint64_t byte_count() const { return static_cast<uint64_t>(row_bytes()) * static_cast<uint64_t>(height_); }
+    uint8_t* pixels() { return pixels_; }
+    const uint8_t* pixels() const { return pixels_; }
+    uint8_t* row(int32_t y) { return pixels_ + static_cast<size_t>(y) * row_bytes(); }
+    const uint8_t* row(int32_t y) const { return pixels_ + static_cast<size_t>(y) * row_bytes(); }
+
+    // Every pixel becomes transparent black.
+    void clear();
+    // Copies all pixels to `out` when `capacity` bytes hold them; otherwise
+    // copies nothing and returns false.
+    bool copy_to(void* out, uint64_t capacity) const;
+
+private:
+    enum class Memory { kBorrowed, kHeap, kMapped };
+
+    uint8_t* pixels_ = nullptr;
+    int32_t width_ = 0;
+    int32_t height_ = 0;
+    Memory memory_ = Memory::kBorrowed;
+};
+
+// Draws `source` turned clockwise (y pointing down) by quarter_turns x 90
+// degrees about the integer point (pivot_x, pivot_y): source point p lands
+// at R(p - pivot) + pivot. Any integer number of turns, negative included.
+// Target pixels that no source pixel covers are left as they are.
+void draw_turned(const Bitmap& source, int quarter_turns, int32_t pivot_x, int32_t pivot_y, Bitmap& target);
+
+// Turns the bitmap half a turn about the integer pivot in place. The pixels
+// are those of drawing it turned onto a cleared bitmap of the same size
+// (pixels that nothing covers become transparent black), without a second
+// bitmap.
+void turn_half_in_place(Bitmap& bitmap, int32_t pivot_x, int32_t pivot_y);
+
+// Draws `source` scaled by the factors: target pixel (c, r) takes the source
+// pixel under its centre mapped back, ((c + 0.5) / scale_x, (r + 0.5) /
+// scale_y), clamped into the source. Factors must be positive (otherwise
+// nothing is drawn).
+void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& target);
+
+}  // namespace platform
+}  // namespace qk
+
+#endif  // QKCORE_SRC_PLATFORM_RASTER_H

@@ -1,0 +1,92 @@
+// Small images whose bytes all differ, and snapshots that show whether an
+// operation left an image alone.
+#ifndef QKCORE_TESTS_GEOMETRY_IMAGES_H
+#define QKCORE_TESTS_GEOMETRY_IMAGES_H
+
+#include <stdint.h>
+#include <string.h>
+
+#include <memory>
+#include <string>
+#include <tuple>
+#include <vector>
+
+#include "qkcore/qk_image.h"
+
+namespace qktest {
+
+struct Destroy {
+    void operator()(QKImage* image) const { QKImage_destroy(image); }
+};
+using ImagePtr = std::unique_ptr<QKImage, Destroy>;
+
+inline std::string fourcc(uint32_t code) {
+    std::string name(reinterpret_cast<const char*>(&code), 4);
+    return name.substr(0, name.find('\0'));
+}
+
+// Byte i becomes (i * 37 + seed) mod 256: in buffers of up to 256 bytes every
+// byte differs, so a byte taken from the wrong place shows.
+inline void fill_distinct(QKImage& image, uint8_t seed = 11) {
+    for (uint64_t i = 0; i < QKImage_size(&image); ++i) image.data[i] = static_cast<uint8_t>(i * 37 + seed);
+}
+
+inline ImagePtr distinct_image(int32_t width, int32_t height, uint32_t format, uint8_t seed = 11) {
+    ImagePtr image(QKImage_createNew(width, height, format));
+    fill_distinct(*image, seed);
+    return image;
+}
+
+// Opaque RGBA pixel number i, distinct for i < 65536.
+inline uint32_t rgba_pixel(int i) {
+    return static_cast<uint32_t>(i & 0xff) | static_cast<uint32_t>((i >> 8) & 0xff) << 8 | 0x5au << 16 | 0xffu << 24;
+}
+
+inline uint32_t pixel_at(const QKImage& image, int32_t x, int32_t y) {
+    uint32_t value;
+    memcpy(&value, image.data + (static_cast<size_t>(y) * image.width + x) * 4, 4);
+    return value;
+}
+
+inline void set_pixel(QKImage& image, int32_t x, int32_t y, uint32_t value) {
+    memcpy(image.data + (static_cast<size_t>(y) * image.width + x) * 4, &value, 4);
+}
+
+// An RGBA image whose pixel (x, y) is rgba_pixel(y * width + x).
+inline ImagePtr numbered_rgba(int32_t width, int32_t height) {
+    ImagePtr image(QKImage_createNew(width, height, QK_FORMAT_RGBA));
+    for (int32_t i = 0; i < width * height; ++i) set_pixel(*image, i % width, i / width, rgba_pixel(i));
+    return image;
+}
+
+// Every field of an image and the bytes of its buffer.
+inline auto snapshot(const QKImage& image) {
+    std::vector<uint8_t> bytes;
+    if (image.data != nullptr) bytes.assign(image.data, image.data + QKImage_size(&image));
+    return std::make_tuple(image.data, image.width, image.height, image.format, image.isWrapped, image.size,
+                           image.chromaOffset, bytes);
+}
+
+// The Y, U and V samples of pixel (x, y) of a 4:2:0 image, each addressed on
+// its own from the format's layout and the image's chroma base.
+inline std::tuple<uint8_t, uint8_t, uint8_t> yuv_at(const QKImage& image, int32_t x, int32_t y) {
+    const size_t w = static_cast<size_t>(image.width);
+    const size_t base = image.chromaOffset != 0 ? image.chromaOffset : w * image.height;
+    const size_t quarter = w * image.height / 4;
+    const uint8_t* d = image.data + base;
+    const size_t pair = (y / 2) * w + (x / 2) * 2;    // NV12, NV21: U,V pairs in rows of w bytes
+    const size_t plane = (y / 2) * (w / 2) + x / 2;   // YV12, YUVP: planes with rows of w / 2 bytes
+    const uint8_t luma = image.data[y * w + x];
+    switch (image.format) {
+        case QK_FORMAT_NV12: return {luma, d[pair], d[pair + 1]};
+        case QK_FORMAT_NV21: return {luma, d[pair + 1], d[pair]};
+        case QK_FORMAT_YV12: return {luma, d[quarter + plane], d[plane]};
+        default: return {luma, d[plane], d[quarter + plane]};  // YUVP
+    }
+}
+
+constexpr uint32_t kYuv420Formats[] = {QK_FORMAT_NV12, QK_FORMAT_NV21, QK_FORMAT_YV12, QK_FORMAT_YUVP};
+
+}  // namespace qktest
+
+#endif  // QKCORE_TESTS_GEOMETRY_IMAGES_H

@@ -1,0 +1,115 @@
+#include <gtest/gtest.h>
+#include <stdint.h>
+
+#include <vector>
+
+#include "geometry/images.h"
+#include "qkcore/qk_image.h"
+#include "support/log_capture.h"
+
+namespace {
+
+using namespace qktest;
+
+// The source pixel that output pixel (c, r) shows after `orient`
+// counter-clockwise quarter turns of a w x h picture about the integer pivots
+// (w/2, h/2), (w/2, w/2), (w/2, h/2), (h/2, h/2). False where nothing lands:
+// the far row or column when a dimension is odd.
+bool shown_source(int orient, int32_t w, int32_t h, int32_t c, int32_t r, int32_t* sx, int32_t* sy) {
+    switch (orient) {
+        case 0: *sx = c, *sy = r; break;
+        case 1: *sx = 2 * (w / 2) - 1 - r, *sy = c; break;
+        case 2: *sx = 2 * (w / 2) - 1 - c, *sy = 2 * (h / 2) - 1 - r; break;
+        default: *sx = r, *sy = 2 * (h / 2) - 1 - c; break;
+    }
+    return *sx >= 0 && *sx < w && *sy >= 0 && *sy < h;
+}
+
+TEST(Rotate, EveryAngleMapsEveryPixel) {
+    const struct {
+        int32_t angle;
+        int orient;
+    } angles[] = {{0, 0}, {90, 1}, {180, 2}, {270, 3}, {-90, 3}, {-180, 2}, {-270, 1}, {-360, 0}, {450, 1}, {900, 2}};
+    const struct {
+        int32_t w, h;
+    } sizes[] = {{4, 2}, {8, 4}, {5, 3}, {3, 5}, {7, 9}, {1, 1}, {1, 4}, {5, 1}};
+    for (const auto& size : sizes) {
+        for (const auto& a : angles) {
+            SCOPED_TRACE(::testing::Message() << size.w << "x" << size.h << " by " << a.angle);
+            ImagePtr image = numbered_rgba(size.w, size.h);
+            uint8_t* buffer = image->data;
+            LogCapture log;
+            ASSERT_EQ(QKImage_rotate(image.get(), a.angle), QK_OK);
+            EXPECT_TRUE(HasNoErrors(log));
+            EXPECT_EQ(image->data, buffer);
+            const bool exchanged = a.orient % 2 == 1;
+            ASSERT_EQ(image->width, exchanged ? size.h : size.w);
+            ASSERT_EQ(image->height, exchanged ? size.w : size.h);
+            for (int32_t r = 0; r < image->height; ++r) {
+                for (int32_t c = 0; c < image->width; ++c) {
+                    int32_t sx, sy;
+                    const bool shown = shown_source(a.orient, size.w, size.h, c, r, &sx, &sy);
+                    ASSERT_EQ(pixel_at(*image, c, r), shown ? rgba_pixel(sy * size.w + sx) : 0) << c << "," << r;
+                }
+            }
+        }
+    }
+}
+
+// Apart from the table above: turning counter-clockwise puts the source's
+// last column, top to bottom, into the output's first row.
+TEST(Rotate, QuarterTurnPutsTheLastColumnFirst) {
+    ImagePtr image = numbered_rgba(4, 2);
+    ASSERT_EQ(QKImage_rotate(image.get(), 90), QK_OK);
+    EXPECT_EQ(pixel_at(*image, 0, 0), rgba_pixel(3));
+    EXPECT_EQ(pixel_at(*image, 1, 0), rgba_pixel(7));
+    EXPECT_EQ(pixel_at(*image, 0, 3), rgba_pixel(0));
+}
+
+TEST(Rotate, TranslucentPixelsArriveUnchangedOverTheClearedOutput) {
+    // Odd width: the last output row of a quarter turn stays uncovered.
+    ImagePtr image(QKImage_createNew(3, 2, QK_FORMAT_RGBA));
+    const uint32_t pixels[] = {0x00000000, 0x40302010, 0x80808080, 0x01010101, 0xff0000ff, 0x7f00007f};
+    for (int i = 0; i < 6; ++i) set_pixel(*image, i % 3, i / 3, pixels[i]);
+    LogCapture log;
+    ASSERT_EQ(QKImage_rotate(image.get(), 90), QK_OK);
+    const uint32_t expected[3][2] = {{pixels[1], pixels[4]}, {pixels[0], pixels[3]}, {0, 0}};
+    for (int r = 0; r < 3; ++r) {
+        for (int c = 0; c < 2; ++c) EXPECT_EQ(pixel_at(*image, c, r), expected[r][c]) << c << "," << r;
+    }
+    EXPECT_EQ(log.texts(1), std::vector<std::string>{"Rotation parameters: angle = 90, orient = 1, in w/h = 3x2, "
+                                                     "out w/h = 2x3, pivot = 1,1"});
+}
+
+TEST(Rotate, RefusalsLeaveTheImageAlone) {
+    std::vector<uint8_t> pixels(24, 0x5a);
+    const struct {
+        const char* what;
+        int32_t width, height;
+        uint32_t format;
+        int32_t size, angle, status;
+    } cases[] = {
+        {"angle 45", 3, 2, QK_FORMAT_RGBA, 0, 45, QK_ERROR_INVALID_PARAM},
+        {"width 0", 0, 2, QK_FORMAT_RGBA, 0, 90, QK_ERROR_INVALID_SIZE},
+        {"no size rule", 3, 2, QK_FORMAT_JPEG, 0, 90, QK_ERROR_INVALID_SIZE},
+        {"buffer larger than the picture", 2, 2, QK_FORMAT_RGBA, 24, 90, QK_ERROR_INVALID_SIZE},
+        {"buffer smaller than the picture", 3, 2, QK_FORMAT_RGBA, 20, 180, QK_ERROR_INVALID_SIZE},
+        {"recorded size, negative width", -3, 2, QK_FORMAT_RGBA, 24, 90, QK_ERROR_INVALID_SIZE},
+        {"no buffer", 3, 2, QK_FORMAT_RGBA, -1, 90, QK_ERROR_NULL_PARAM},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        ImagePtr image(QKImage_createWrap(c.size < 0 ? nullptr : pixels.data(), c.width, c.height, c.format,
+                                          c.size, 0));
+        const auto before = snapshot(*image);
+        LogCapture log;
+        EXPECT_EQ(QKImage_rotate(image.get(), c.angle), c.status);
+        EXPECT_TRUE(HasOneFailureReport(log, c.status, "src/geometry/rotate.cpp"));
+        EXPECT_TRUE(snapshot(*image) == before);
+    }
+    LogCapture log;
+    EXPECT_EQ(QKImage_rotate(nullptr, 90), QK_ERROR_NULL_PARAM);
+    EXPECT_TRUE(HasOneFailureReport(log, QK_ERROR_NULL_PARAM, "src/geometry/rotate.cpp"));
+}
+
+}  // namespace

@@ -1,0 +1,116 @@
+#include "platform/raster.h"
+
+#include <gtest/gtest.h>
+#include <stdint.h>
+#include <string.h>
+
+#include <vector>
+
+namespace {
+
+using qk::platform::Bitmap;
+
+uint32_t pixel(const Bitmap& bitmap, int32_t x, int32_t y) {
+    uint32_t value;
+    memcpy(&value, bitmap.row(y) + x * 4, 4);
+    return value;
+}
+
+void set(Bitmap& bitmap, int32_t x, int32_t y, uint32_t value) { memcpy(bitmap.row(y) + x * 4, &value, 4); }
+
+uint32_t rgba(int r, int g, int b, int a) {
+    const uint8_t bytes[4] = {uint8_t(r), uint8_t(g), uint8_t(b), uint8_t(a)};
+    uint32_t value;
+    memcpy(&value, bytes, 4);
+    return value;
+}
+
+TEST(Bitmap, OwnedPixelsAndTheirLimits) {
+    // Small bitmaps come from the heap, frame-sized ones are mapped: both
+    // start transparent black when asked to.
+    for (auto [w, h] : {std::pair<int32_t, int32_t>{5, 3}, {1024, 1025}}) {
+        Bitmap owned;
+        ASSERT_TRUE(owned.allocate(w, h, /*cleared=*/true));
+        EXPECT_EQ(owned.row_bytes(), size_t(w) * 4);
+        const std::vector<uint8_t> zero(owned.byte_count(), 0);
+        EXPECT_EQ(0, memcmp(owned.pixels(), zero.data(), zero.size()));
+        std::vector<uint8_t> out(owned.byte_count());
+        EXPECT_FALSE(owned.copy_to(out.data(), out.size() - 1));  // too small: nothing copied
+        EXPECT_TRUE(owned.copy_to(out.data(), out.size()));
+    }
+    Bitmap refused;
+    EXPECT_FALSE(refused.allocate(3, -1, false));
+    EXPECT_FALSE(refused.allocate(32768, 16384, false));  // 2 GiB: past the library's byte counts
+    EXPECT_FALSE(refused.borrow(nullptr, 3, 2));
+    EXPECT_FALSE(refused.has_pixels());
+}
+
+// Premultiplied source-over: result = src + dst x (255 - src alpha) / 255.
+TEST(Raster, DrawingBlendsSourceOver) {
+    const struct {
+        uint32_t src, dst, expected;
+    } cases[] = {
+        {rgba(10, 20, 30, 255), rgba(200, 200, 200, 255), rgba(10, 20, 30, 255)},    // opaque: a copy
+        {rgba(10, 20, 30, 40), 0, rgba(10, 20, 30, 40)},                              // onto transparent black
+        {0, rgba(1, 2, 3, 4), rgba(1, 2, 3, 4)},                                      // transparent: nothing
+        {rgba(100, 50, 0, 128), rgba(200, 200, 200, 255), rgba(200, 150, 100, 255)},  // 127/255 of the target
+        {rgba(0, 0, 0, 1), rgba(255, 128, 1, 255), rgba(254, 127, 1, 255)},           // rounded to nearest
+        {rgba(250, 0, 0, 10), rgba(200, 0, 0, 200), rgba(255, 0, 0, 202)},            // saturates
+    };
+    for (const auto& c : cases) {
+        Bitmap source, target;
+        ASSERT_TRUE(source.allocate(1, 1, false));
+        ASSERT_TRUE(target.allocate(1, 1, false));
+        set(source, 0, 0, c.src);
+        set(target, 0, 0, c.dst);
+        qk::platform::draw_turned(source, 0, 0, 0, target);
+        EXPECT_EQ(pixel(target, 0, 0), c.expected) << std::hex << c.src << " over " << c.dst;
+        set(target, 0, 0, c.dst);
+        qk::platform::draw_scaled(source, 1.0f, 1.0f, target);
+        EXPECT_EQ(pixel(target, 0, 0), c.expected) << std::hex << c.src << " over " << c.dst << " (scaled)";
+    }
+}
+
+// Forward reference: the centre of source pixel (i, j) turned clockwise about
+// the pivot lands on the centre of the target pixel that shows it. Half turns
+// are also checked in place.
+TEST(Raster, TurnsAboutAnIntegerPivot) {
+    const struct {
+        int32_t w, h, tw, th, px, py;
+    } shapes[] = {{4, 2, 4, 4, 2, 1}, {5, 3, 6, 6, 2, 2}, {3, 5, 5, 5, 1, 3}, {2, 2, 3, 3, 0, 0},
+                  {4, 3, 4, 3, 2, 1}, {8, 8, 8, 8, 4, 4}, {13, 9, 11, 14, 6, 5}, {6, 4, 6, 4, 5, 0}};
+    for (const auto& s : shapes) {
+        // Opaque in the top half, translucent below: blocks of either kind and mixed ones.
+        auto value = [&](int32_t i, int32_t j) { return rgba(i, j, 7, j < s.h / 2 ? 255 : 20 + i * 10 + j); };
+        Bitmap source;
+        ASSERT_TRUE(source.allocate(s.w, s.h, false));
+        for (int32_t j = 0; j < s.h; ++j) {
+            for (int32_t i = 0; i < s.w; ++i) set(source, i, j, value(i, j));
+        }
+        for (int turns : {0, 1, 2, 3, -1, 6}) {
+            SCOPED_TRACE(::testing::Message() << s.w << "x" << s.h << " pivot " << s.px << "," << s.py << " turns "
+                                              << turns);
+            std::vector<uint32_t> expected(size_t(s.tw) * s.th, 0);
+            for (int32_t j = 0; j < s.h; ++j) {
+                for (int32_t i = 0; i < s.w; ++i) {
+                    // Doubled coordinates keep the half-pixel centres integral.
+                    int64_t x = 2 * i + 1 - 2 * s.px, y = 2 * j + 1 - 2 * s.py;
+                    for (int k = 0; k < ((turns % 4) + 4) % 4; ++k) std::swap(x, y), x = -x;  // (x, y) -> (-y, x)
+                    const int64_t tx = (x + 2 * s.px - 1) / 2, ty = (y + 2 * s.py - 1) / 2;
+                    if (tx >= 0 && tx < s.tw && ty >= 0 && ty < s.th) expected[ty * s.tw + tx] = value(i, j);
+                }
+            }
+            Bitmap target;
+            ASSERT_TRUE(target.allocate(s.tw, s.th, /*cleared=*/true));
+            qk::platform::draw_turned(source, turns, s.px, s.py, target);
+            EXPECT_EQ(0, memcmp(target.pixels(), expected.data(), target.byte_count()));
+            if (turns == 2 && s.tw == s.w && s.th == s.h) {
+                ASSERT_TRUE(source.copy_to(target.pixels(), target.byte_count()));
+                qk::platform::turn_half_in_place(target, s.px, s.py);
+                EXPECT_EQ(0, memcmp(target.pixels(), expected.data(), target.byte_count())) << "in place";
+            }
+        }
+    }
+}
+
+}  // namespace
