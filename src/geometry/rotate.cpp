@@ -65,9 +65,20 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
 
 namespace {
 
-// Waits for the conversion entry (QKImage_convert there and back).
-int32_t rotate_through_rgba([[maybe_unused]] QKImage* image, [[maybe_unused]] int32_t angle) {
-    return QK_FAIL(QK_ERROR_UNSUPPORTED);
+// Converts to a temporary RGBA image, turns it, and converts back into the
+// caller's buffer, stopping at the first failure. The temporary owns only the
+// buffer it allocates, freed when it goes out of scope on every path.
+int32_t rotate_through_rgba(QKImage* image, int32_t angle) {
+    QKImage rgba;
+    rgba.width = image->width;
+    rgba.height = image->height;
+    rgba.format = QK_FORMAT_RGBA;
+    const int32_t allocated = QKImage_allocate(&rgba);
+    if (allocated < 0) return allocated;
+    int32_t status = QKImage_convert(image, &rgba);
+    if (status == QK_OK) status = qk::rotate_rgba(&rgba, angle);
+    if (status == QK_OK) status = QKImage_convert(&rgba, image);
+    return status;
 }
 
 }  // namespace

@@ -1,6 +1,9 @@
 #include <gtest/gtest.h>
 #include <stdint.h>
+#include <stdio.h>
+#include <string.h>
 
+#include <string>
 #include <vector>
 
 #include "geometry/images.h"
@@ -110,6 +113,76 @@ TEST(Rotate, RefusalsLeaveTheImageAlone) {
     LogCapture log;
     EXPECT_EQ(QKImage_rotate(nullptr, 90), QK_ERROR_NULL_PARAM);
     EXPECT_TRUE(HasOneFailureReport(log, QK_ERROR_NULL_PARAM, "src/geometry/rotate.cpp"));
+}
+
+}  // namespace
+
+namespace {
+
+using namespace qktest;
+
+std::string warning_for(const QKImage& image) {
+    char text[160];
+    snprintf(text, sizeof(text),
+             "Rotation is supported on RGBA images only for now: using temporary RGBA copy of this %dx%d '%4.4s' "
+             "image",
+             image.width, image.height, reinterpret_cast<const char*>(&image.format));
+    return text;
+}
+
+// Other formats turn through RGBA: the result is exactly converting to RGBA,
+// turning that, and converting back into the same buffer.
+TEST(RotateThroughRgba, EqualsConvertTurnConvertBack) {
+    const struct {
+        uint32_t format;
+        int32_t width, height, angle;
+    } cases[] = {
+        {QK_FORMAT_NV21, 16, 8, 270}, {QK_FORMAT_NV12, 6, 4, 90},  {QK_FORMAT_YV12, 8, 4, -90},
+        {QK_FORMAT_YUVP, 4, 4, 180},  {QK_FORMAT_YUYV, 8, 4, 90},  {QK_FORMAT_GREY, 5, 3, 90},
+        {QK_FORMAT_BGR8, 7, 2, 270},  {QK_FORMAT_ABGR, 3, 3, 180},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(::testing::Message() << fourcc(c.format) << " " << c.width << "x" << c.height << " by "
+                                          << c.angle);
+        ImagePtr image = distinct_image(c.width, c.height, c.format);
+        ImagePtr expected(QKImage_clone(image.get()));
+        ImagePtr rgba(QKImage_copyAndConvert(image.get(), QK_FORMAT_RGBA));
+        ASSERT_TRUE(rgba);
+        ASSERT_EQ(QKImage_rotate(rgba.get(), c.angle), QK_OK);
+        ASSERT_EQ(QKImage_convert(rgba.get(), expected.get()), QK_OK);
+
+        const std::string warning = warning_for(*image);
+        uint8_t* buffer = image->data;
+        LogCapture log;
+        ASSERT_EQ(QKImage_rotate(image.get(), c.angle), QK_OK);
+        EXPECT_TRUE(HasNoErrors(log));
+        EXPECT_EQ(log.texts(3), std::vector<std::string>{warning});
+        EXPECT_EQ(image->data, buffer);
+        EXPECT_EQ(image->format, c.format);
+        EXPECT_EQ(image->width, expected->width);
+        EXPECT_EQ(image->height, expected->height);
+        EXPECT_EQ(memcmp(image->data, expected->data, QKImage_size(expected.get())), 0);
+    }
+}
+
+TEST(RotateThroughRgba, ConversionRefusalsLeaveTheImageAlone) {
+    const struct {
+        uint32_t format;
+        int32_t width, height, status;
+    } cases[] = {
+        {QK_FORMAT_D16, 4, 2, QK_ERROR_UNSUPPORTED},   // no way into RGBA
+        {QK_FORMAT_YUYV, 4, 3, QK_ERROR_INVALID_SIZE},  // turned, it would be 3 pixels wide
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(fourcc(c.format));
+        ImagePtr image = distinct_image(c.width, c.height, c.format);
+        const auto before = snapshot(*image);
+        LogCapture log;
+        EXPECT_EQ(QKImage_rotate(image.get(), 90), c.status);
+        EXPECT_EQ(log.texts(3), std::vector<std::string>{warning_for(*image)});
+        EXPECT_TRUE(HasOneFailureReport(log, c.status, "src/convert/convert.cpp"));
+        EXPECT_TRUE(snapshot(*image) == before);
+    }
 }
 
 }  // namespace
