@@ -41,7 +41,7 @@ int usage_error(const FrameCommand& command, const std::string& message) {
 bool parse_frame_args(const FrameCommand& command, int argc, char** argv, FrameArgs* args) {
     std::vector<std::string> known = command.options;
     known.push_back("--size");
-    known.push_back("--format");
+    known.push_back(command.format_option);
     std::vector<std::string> paths;
     for (int i = 0; i < argc; ++i) {
         const std::string arg = argv[i];
@@ -69,8 +69,9 @@ bool parse_frame_args(const FrameCommand& command, int argc, char** argv, FrameA
         usage_error(command, "bad --size '" + args->options["--size"] + "' (want WIDTHxHEIGHT)");
         return false;
     }
-    if (!parse_format(args->options["--format"].c_str(), &args->format)) {
-        usage_error(command, "unknown --format '" + args->options["--format"] + "'");
+    const std::string& format = args->options[command.format_option];
+    if (!parse_format(format.c_str(), &args->format)) {
+        usage_error(command, std::string("unknown ") + command.format_option + " '" + format + "'");
         return false;
     }
     if (paths.size() != 2) {

@@ -18,6 +18,7 @@ struct FrameCommand {
     const char* name;   // "rotate"
     const char* usage;  // the arguments after the name
     std::vector<std::string> options;  // the operation's own options, e.g. "--angle"
+    const char* format_option = "--format";  // names the input frame's format
 };
 
 struct FrameArgs {
@@ -29,7 +30,7 @@ struct FrameArgs {
     std::string output;
 };
 
-// Parses --size, --format, the command's options (each required) and the two
+// Parses --size, the format option, the command's options (each required) and the two
 // paths. On a bad argument prints a message and the usage to stderr and
 // returns false.
 bool parse_frame_args(const FrameCommand& command, int argc, char** argv, FrameArgs* args);
