@@ -28,13 +28,6 @@ bool dimensions_fit(uint32_t format, int32_t width, int32_t height) {
     return true;
 }
 
-// End of a 4:2:0 image's chroma, from its own chroma offset, once it has the
-// given dimensions.
-uint64_t chroma_end(const QKImage& image, int32_t width, int32_t height) {
-    return qk::chroma_base(image.chromaOffset, width, height) +
-           static_cast<uint64_t>(width) * static_cast<uint64_t>(height) / 2;
-}
-
 // Same format: one block, or luma and chroma separately when the two images
 // keep their chroma in different places (or the block would miss it).
 // memmove, because converting an image into itself is a harmless no-op.
@@ -79,11 +72,12 @@ int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
     // A chroma offset moves the chroma elsewhere in the buffer: it must still
     // end inside the destination's buffer, and inside the source's where the
     // source records its size.
-    if (qk::is_yuv420_format(dst->format) && chroma_end(*dst, src->width, src->height) > capacity) {
+    if (qk::is_yuv420_format(dst->format) &&
+        qk::yuv420_extent(dst->chromaOffset, src->width, src->height) > capacity) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
     if (qk::is_yuv420_format(src->format) && src->size != 0 &&
-        chroma_end(*src, src->width, src->height) > src->size) {
+        qk::yuv420_extent(src->chromaOffset, src->width, src->height) > src->size) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
     const uint64_t copyLength = (dst->size != 0 && dst->size == src->size) ? dst->size : needed;

@@ -37,8 +37,7 @@ void copy_block(const uint8_t* src_plane, int64_t src_width, int64_t src_x, int6
 bool buffer_holds_image(const QKImage& image) {
     uint64_t needed = QKImage_requiredSize(image.width, image.height, image.format);
     if (needed != 0 && image.size != 0 && image.chromaOffset != 0 && is_yuv420_format(image.format)) {
-        const uint64_t luma = static_cast<uint64_t>(image.width) * static_cast<uint64_t>(image.height);
-        needed = std::max(luma, chroma_base(image) + luma / 2);
+        needed = yuv420_extent(image.chromaOffset, image.width, image.height);
     }
     return QKImage_size(&image) >= needed;
 }

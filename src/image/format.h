@@ -38,6 +38,14 @@ inline uint64_t chroma_base(const QKImage& image) {
     return chroma_base(image.chromaOffset, image.width, image.height);
 }
 
+// Bytes a 4:2:0 image of these (positive) dimensions reaches into its buffer:
+// its luma plane, and width x height / 2 bytes of chroma from the chroma base.
+inline uint64_t yuv420_extent(uint32_t chromaOffset, int32_t width, int32_t height) {
+    const uint64_t luma = static_cast<uint64_t>(width) * static_cast<uint64_t>(height);
+    const uint64_t chroma_end = chroma_base(chromaOffset, width, height) + luma / 2;
+    return chroma_end > luma ? chroma_end : luma;
+}
+
 // Where the U and V samples of a 4:2:0 image start: NV12 and NV21 interleave
 // them from the chroma base, YV12 and YUVP hold two planes of
 // (width x height) / 4 bytes each.
