@@ -7,6 +7,7 @@
 
 #include "image/format.h"
 #include "image/status.h"
+#include "platform/memory.h"
 #include "qkcore/qk_image.h"
 
 namespace {
@@ -40,7 +41,7 @@ QKImage* QKImage_createEmpty(int32_t width, int32_t height, uint32_t format) {
 QKImage* QKImage_createNew(int32_t width, int32_t height, uint32_t format) {
     uint64_t bytes = QKImage_requiredSize(width, height, format);
     if (bytes == 0) return nullptr;
-    void* buffer = malloc(bytes);
+    void* buffer = qk::platform::allocate_pixels(bytes);
     if (buffer == nullptr) return nullptr;
     QKImage* image = QKImage_createEmpty(width, height, format);
     if (image == nullptr) {
@@ -74,7 +75,7 @@ int32_t QKImage_allocate(QKImage* image) {
     if (bytes == 0 || bytes > INT32_MAX) return QK_FAIL(QK_ERROR_INVALID_PARAM);
     // A point cloud needs room for the point count of its header.
     if (image->format == QK_FORMAT_PCL && bytes < sizeof(uint32_t)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    void* buffer = malloc(bytes);
+    void* buffer = qk::platform::allocate_pixels(bytes);
     if (buffer == nullptr) return QK_FAIL(QK_ERROR_ALLOC_FAILED);
     image->data = static_cast<uint8_t*>(buffer);
     image->isWrapped = 0;

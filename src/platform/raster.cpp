@@ -3,10 +3,11 @@
 #include <stdint.h>
 #include <stdlib.h>
 #include <string.h>
-#include <sys/mman.h>
 
 #include <algorithm>
 #include <cmath>
+
+#include "platform/memory.h"
 
 namespace qk {
 namespace platform {
@@ -14,25 +15,6 @@ namespace platform {
 namespace {
 
 constexpr uint64_t kMaxBitmapBytes = INT32_MAX;
-
-// Frame-sized bitmaps are mapped directly: fresh mappings are zero (clearing
-// costs nothing), and large pages, where the system offers them, cut the
-// cost of first touching tens of megabytes from thousands of page faults to
-// a few dozen.
-constexpr uint64_t kMapThreshold = uint64_t{4} << 20;
-constexpr uint64_t kLargePage = uint64_t{2} << 20;
-
-void* map_pixels(uint64_t bytes) {
-    void* memory = mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
-    if (memory == MAP_FAILED) return nullptr;
-#ifdef MADV_HUGEPAGE
-    // Only a hint: ignored where large pages are not available.
-    const uintptr_t start = (reinterpret_cast<uintptr_t>(memory) + kLargePage - 1) & ~(kLargePage - 1);
-    const uintptr_t end = (reinterpret_cast<uintptr_t>(memory) + bytes) & ~(kLargePage - 1);
-    if (end > start) madvise(reinterpret_cast<void*>(start), end - start, MADV_HUGEPAGE);
-#endif
-    return memory;
-}
 
 // x / 255 rounded to nearest, exact for x in [0, 255 * 255].
 inline unsigned div255(unsigned x) {
@@ -143,29 +125,21 @@ bool Bitmap::allocate(int32_t width, int32_t height, bool cleared) {
     if (width < 1 || height < 1) return false;
     const uint64_t bytes = uint64_t{kBitmapBytesPerPixel} * static_cast<uint64_t>(width) * static_cast<uint64_t>(height);
     if (bytes > kMaxBitmapBytes) return false;
-    void* memory = nullptr;
-    Memory kind = Memory::kHeap;
-    if (bytes >= kMapThreshold) {
-        memory = map_pixels(bytes);
-        kind = Memory::kMapped;
-    } else {
-        memory = cleared ? calloc(bytes, 1) : malloc(bytes);
-    }
+    void* memory = allocate_pixels(bytes, cleared);
     if (memory == nullptr) return false;
     pixels_ = static_cast<uint8_t*>(memory);
     width_ = width;
     height_ = height;
-    memory_ = kind;
+    owned_ = true;
     return true;
 }
 
 void Bitmap::release() {
-    if (memory_ == Memory::kHeap) free(pixels_);
-    if (memory_ == Memory::kMapped) munmap(pixels_, byte_count());
+    if (owned_) free(pixels_);
     pixels_ = nullptr;
     width_ = 0;
     height_ = 0;
-    memory_ = Memory::kBorrowed;
+    owned_ = false;
 }
 
 void Bitmap::clear() {

@@ -31,7 +31,7 @@ public:
     // is never freed here. False, and no pixels, for a dimension below 1.
     bool borrow(uint8_t* pixels, int32_t width, int32_t height);
     // Gets memory of its own: uninitialised, or transparent black when
-    // `cleared` (cheaper than clearing afterwards: fresh pages are zero).
+    // `cleared` (cheaper than clearing afterwards: fresh memory comes zeroed).
     // False, and no pixels, for a dimension below 1, a size past the signed
     // 32-bit byte counts of the library, or memory that cannot be had.
     bool allocate(int32_t width, int32_t height, bool cleared);
@@ -55,12 +55,10 @@ public:
     bool copy_to(void* out, uint64_t capacity) const;
 
 private:
-    enum class Memory { kBorrowed, kHeap, kMapped };
-
     uint8_t* pixels_ = nullptr;
     int32_t width_ = 0;
     int32_t height_ = 0;
-    Memory memory_ = Memory::kBorrowed;
+    bool owned_ = false;
 };
 
 // Draws `source` turned clockwise (y pointing down) by quarter_turns x 90
