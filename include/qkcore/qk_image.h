@@ -81,7 +81,11 @@ QK_API int32_t QKImage_allocate(QKImage* image);
 QK_API void QKImage_deallocate(QKImage* image);
 QK_API void QKImage_reset(QKImage* image);
 QK_API void QKImage_destroy(QKImage* image);
+// An owned copy of the source's pixels (4:2:0 chroma kept at a separate
+// offset is gathered right behind the luma); null for a source without
+// buffer or size rule, or one whose recorded size is short of its picture.
 QK_API QKImage* QKImage_clone(const QKImage* source);
+// The source's width, height and format, without buffer.
 QK_API QKImage* QKImage_cloneHeader(const QKImage* source);
 // Makes the image use the caller's buffer (its own owned buffer is freed
 // first); returns the buffer's byte count or a negative status.
@@ -97,6 +101,7 @@ QK_API int32_t QKImage_convert(const QKImage* src, QKImage* dst);
 // A new image of the source's size in `format`, converted from the source;
 // null on any failure. The caller releases it with QKImage_destroy.
 QK_API QKImage* QKImage_copyAndConvert(const QKImage* src, uint32_t format);
+
 // Geometry.
 
 // Turns the image in place by `angle` degrees, any multiple of 90 (negative
