@@ -70,16 +70,13 @@ int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
     const uint64_t capacity = QKImage_size(dst);
     if (capacity < needed) return QK_FAIL(QK_ERROR_INVALID_SIZE);
     // A chroma offset moves the chroma elsewhere in the buffer: it must still
-    // end inside the destination's buffer, and inside the source's where the
-    // source records its size.
+    // end inside the destination's buffer. The source must hold its whole
+    // picture where it records its size.
     if (qk::is_yuv420_format(dst->format) &&
         qk::yuv420_extent(dst->chromaOffset, src->width, src->height) > capacity) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
-    if (qk::is_yuv420_format(src->format) && src->size != 0 &&
-        qk::yuv420_extent(src->chromaOffset, src->width, src->height) > src->size) {
-        return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    }
+    if (!qk::buffer_holds_image(*src)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
     const uint64_t copyLength = (dst->size != 0 && dst->size == src->size) ? dst->size : needed;
 
     dst->width = src->width;

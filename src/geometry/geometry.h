@@ -14,15 +14,6 @@ namespace qk {
 // with its report and the image unchanged.
 int32_t rotate_rgba(QKImage* image, int32_t angle);
 
-// True when the image's buffer holds the whole picture that its width,
-// height and format describe. A recorded size is checked against everything
-// the picture occupies, 4:2:0 chroma at a separate chromaOffset included;
-// without a recorded size the rule size is all there is to go by, and a
-// chromaOffset past the luma plane is the caller's promise. Images without a
-// size rule (a dimension below 1, encoded or unknown formats) pass: the
-// operations refuse them on their own terms.
-bool buffer_holds_image(const QKImage& image);
-
 // A rectangle of `cols` x `lines` pixels at (src_x, src_y) of one image and
 // (dst_x, dst_y) of another.
 struct Region {

@@ -34,14 +34,6 @@ void copy_block(const uint8_t* src_plane, int64_t src_width, int64_t src_x, int6
 
 }  // namespace
 
-bool buffer_holds_image(const QKImage& image) {
-    uint64_t needed = QKImage_requiredSize(image.width, image.height, image.format);
-    if (needed != 0 && image.size != 0 && image.chromaOffset != 0 && is_yuv420_format(image.format)) {
-        needed = yuv420_extent(image.chromaOffset, image.width, image.height);
-    }
-    return QKImage_size(&image) >= needed;
-}
-
 void copy_region(const QKImage& src, QKImage& dst, const Region& region) {
     const int64_t sw = src.width, dw = dst.width;
     const int64_t sx = region.src_x, sy = region.src_y, dx = region.dst_x, dy = region.dst_y;

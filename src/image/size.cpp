@@ -1,5 +1,6 @@
 #include <stdint.h>
 
+#include "image/format.h"
 #include "qkcore/qk_image.h"
 
 namespace {
@@ -41,3 +42,15 @@ uint64_t QKImage_size(const QKImage* image) {
     if (image->size != 0) return image->size;
     return QKImage_requiredSize(image->width, image->height, image->format);
 }
+
+namespace qk {
+
+bool buffer_holds_image(const QKImage& image) {
+    uint64_t needed = QKImage_requiredSize(image.width, image.height, image.format);
+    if (needed != 0 && image.size != 0 && image.chromaOffset != 0 && is_yuv420_format(image.format)) {
+        needed = yuv420_extent(image.chromaOffset, image.width, image.height);
+    }
+    return QKImage_size(&image) >= needed;
+}
+
+}  // namespace qk
