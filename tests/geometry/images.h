@@ -67,15 +67,24 @@ inline auto snapshot(const QKImage& image) {
                            image.chromaOffset, bytes);
 }
 
-// The Y, U and V samples of pixel (x, y) of a 4:2:0 image, each addressed on
-// its own from the format's layout and the image's chroma base.
-inline std::tuple<uint8_t, uint8_t, uint8_t> yuv_at(const QKImage& image, int32_t x, int32_t y) {
+inline bool is_yuv420(uint32_t f) {
+    return f == QK_FORMAT_NV12 || f == QK_FORMAT_NV21 || f == QK_FORMAT_YV12 || f == QK_FORMAT_YUVP;
+}
+
+// What pixel (x, y) of a packed RGB or 4:2:0 image holds: its own bytes, or
+// its Y, U and V samples, each addressed on its own from the format's layout
+// and the image's chroma base.
+inline std::vector<uint8_t> pixel_bytes(const QKImage& image, int32_t x, int32_t y) {
     const size_t w = static_cast<size_t>(image.width);
+    if (!is_yuv420(image.format)) {
+        const size_t bpp = QKImage_requiredSize(1, 1, image.format);
+        return std::vector<uint8_t>(image.data + (y * w + x) * bpp, image.data + (y * w + x + 1) * bpp);
+    }
     const size_t base = image.chromaOffset != 0 ? image.chromaOffset : w * image.height;
     const size_t quarter = w * image.height / 4;
     const uint8_t* d = image.data + base;
-    const size_t pair = (y / 2) * w + (x / 2) * 2;    // NV12, NV21: U,V pairs in rows of w bytes
-    const size_t plane = (y / 2) * (w / 2) + x / 2;   // YV12, YUVP: planes with rows of w / 2 bytes
+    const size_t pair = (y / 2) * w + (x / 2) * 2;   // NV12, NV21: U,V pairs in rows of w bytes
+    const size_t plane = (y / 2) * (w / 2) + x / 2;  // YV12, YUVP: planes with rows of w / 2 bytes
     const uint8_t luma = image.data[y * w + x];
     switch (image.format) {
         case QK_FORMAT_NV12: return {luma, d[pair], d[pair + 1]};
@@ -85,7 +94,8 @@ inline std::tuple<uint8_t, uint8_t, uint8_t> yuv_at(const QKImage& image, int32_
     }
 }
 
-constexpr uint32_t kYuv420Formats[] = {QK_FORMAT_NV12, QK_FORMAT_NV21, QK_FORMAT_YV12, QK_FORMAT_YUVP};
+constexpr uint32_t kDrawFormats[] = {QK_FORMAT_RGBA, QK_FORMAT_RGB8, QK_FORMAT_NV12,
+                                     QK_FORMAT_NV21, QK_FORMAT_YV12, QK_FORMAT_YUVP};
 
 }  // namespace qktest
 
