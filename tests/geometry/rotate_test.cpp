@@ -1,6 +1,5 @@
 #include <gtest/gtest.h>
 #include <stdint.h>
-#include <stdio.h>
 #include <string.h>
 
 #include <string>
@@ -57,59 +56,16 @@ TEST(Rotate, EveryAngleMapsEveryPixel) {
     }
 }
 
+// Odd width: the last output row of a quarter turn stays transparent black.
 TEST(Rotate, TranslucentPixelsArriveUnchangedOverTheClearedOutput) {
-    // Odd width: the last output row of a quarter turn stays uncovered.
-    ImagePtr image(QKImage_createNew(3, 2, QK_FORMAT_RGBA));
-    const uint32_t pixels[] = {0x00000000, 0x40302010, 0x80808080, 0x01010101, 0xff0000ff, 0x7f00007f};
-    for (int i = 0; i < 6; ++i) set_pixel(*image, i % 3, i / 3, pixels[i]);
+    uint32_t pixels[] = {0x00000000, 0x40302010, 0x80808080, 0x01010101, 0xff0000ff, 0x7f00007f};
+    const std::vector<uint32_t> expected = {pixels[1], pixels[4], pixels[0], pixels[3], 0, 0};
+    ImagePtr image(QKImage_createWrap(pixels, 3, 2, QK_FORMAT_RGBA, 0, 0));
     LogCapture log;
     ASSERT_EQ(QKImage_rotate(image.get(), 90), QK_OK);
-    const uint32_t expected[3][2] = {{pixels[1], pixels[4]}, {pixels[0], pixels[3]}, {0, 0}};
-    for (int r = 0; r < 3; ++r) {
-        for (int c = 0; c < 2; ++c) EXPECT_EQ(pixel_at(*image, c, r), expected[r][c]) << c << "," << r;
-    }
+    EXPECT_EQ(std::vector<uint32_t>(pixels, pixels + 6), expected);
     EXPECT_EQ(log.texts(1), std::vector<std::string>{"Rotation parameters: angle = 90, orient = 1, in w/h = 3x2, "
                                                      "out w/h = 2x3, pivot = 1,1"});
-}
-
-TEST(Rotate, RefusalsLeaveTheImageAlone) {
-    std::vector<uint8_t> pixels(24, 0x5a);
-    const struct {
-        const char* what;
-        int32_t width, height;
-        uint32_t format;
-        int32_t size, angle, status;
-    } cases[] = {
-        {"angle 45", 3, 2, QK_FORMAT_RGBA, 0, 45, QK_ERROR_INVALID_PARAM},
-        {"width 0", 0, 2, QK_FORMAT_RGBA, 0, 90, QK_ERROR_INVALID_SIZE},
-        {"no size rule", 3, 2, QK_FORMAT_JPEG, 0, 90, QK_ERROR_INVALID_SIZE},
-        {"buffer larger than the picture", 2, 2, QK_FORMAT_RGBA, 24, 90, QK_ERROR_INVALID_SIZE},
-        {"buffer smaller than the picture", 3, 2, QK_FORMAT_RGBA, 20, 180, QK_ERROR_INVALID_SIZE},
-        {"recorded size, negative width", -3, 2, QK_FORMAT_RGBA, 24, 90, QK_ERROR_INVALID_SIZE},
-        {"no buffer", 3, 2, QK_FORMAT_RGBA, -1, 90, QK_ERROR_NULL_PARAM},
-    };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.what);
-        ImagePtr image(QKImage_createWrap(c.size < 0 ? nullptr : pixels.data(), c.width, c.height, c.format,
-                                          c.size, 0));
-        const auto before = snapshot(*image);
-        LogCapture log;
-        EXPECT_EQ(QKImage_rotate(image.get(), c.angle), c.status);
-        EXPECT_TRUE(HasOneFailureReport(log, c.status, "src/geometry/rotate.cpp"));
-        EXPECT_TRUE(snapshot(*image) == before);
-    }
-    LogCapture log;
-    EXPECT_EQ(QKImage_rotate(nullptr, 90), QK_ERROR_NULL_PARAM);
-    EXPECT_TRUE(HasOneFailureReport(log, QK_ERROR_NULL_PARAM, "src/geometry/rotate.cpp"));
-}
-
-std::string warning_for(const QKImage& image) {
-    char text[160];
-    snprintf(text, sizeof(text),
-             "Rotation is supported on RGBA images only for now: using temporary RGBA copy of this %dx%d '%4.4s' "
-             "image",
-             image.width, image.height, reinterpret_cast<const char*>(&image.format));
-    return text;
 }
 
 // Other formats turn through RGBA: the result is exactly converting to RGBA,
@@ -133,7 +89,9 @@ TEST(RotateThroughRgba, EqualsConvertTurnConvertBack) {
         ASSERT_EQ(QKImage_rotate(rgba.get(), c.angle), QK_OK);
         ASSERT_EQ(QKImage_convert(rgba.get(), expected.get()), QK_OK);
 
-        const std::string warning = warning_for(*image);
+        const std::string warning = "Rotation is supported on RGBA images only for now: using temporary RGBA copy of "
+                                    "this " + std::to_string(c.width) + "x" + std::to_string(c.height) + " '" +
+                                    fourcc(c.format) + "' image";
         LogCapture log;
         ASSERT_EQ(QKImage_rotate(image.get(), c.angle), QK_OK);
         EXPECT_TRUE(HasNoErrors(log));
@@ -141,26 +99,6 @@ TEST(RotateThroughRgba, EqualsConvertTurnConvertBack) {
         EXPECT_EQ(std::make_tuple(image->format, image->width, image->height),
                   std::make_tuple(c.format, expected->width, expected->height));
         EXPECT_EQ(memcmp(image->data, expected->data, QKImage_size(expected.get())), 0);
-    }
-}
-
-TEST(RotateThroughRgba, ConversionRefusalsLeaveTheImageAlone) {
-    const struct {
-        uint32_t format;
-        int32_t width, height, status;
-    } cases[] = {
-        {QK_FORMAT_D16, 4, 2, QK_ERROR_UNSUPPORTED},   // no way into RGBA
-        {QK_FORMAT_YUYV, 4, 3, QK_ERROR_INVALID_SIZE},  // turned, it would be 3 pixels wide
-    };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(fourcc(c.format));
-        ImagePtr image = distinct_image(c.width, c.height, c.format);
-        const auto before = snapshot(*image);
-        LogCapture log;
-        EXPECT_EQ(QKImage_rotate(image.get(), 90), c.status);
-        EXPECT_EQ(log.texts(3), std::vector<std::string>{warning_for(*image)});
-        EXPECT_TRUE(HasOneFailureReport(log, c.status, "src/convert/convert.cpp"));
-        EXPECT_TRUE(snapshot(*image) == before);
     }
 }
 
