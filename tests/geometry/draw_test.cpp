@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "geometry/images.h"
+#include "support/images.h"
 #include "qkcore/qk_image.h"
 #include "support/log_capture.h"
 
@@ -78,11 +78,11 @@ TEST(Draw, NothingToDrawIsNotAFailure) {
     ImagePtr src = distinct_image(4, 4, QK_FORMAT_RGBA);
     for (const auto& c : cases) {
         ImagePtr dst = distinct_image(5, 3, QK_FORMAT_RGBA, 200);
-        const auto before = snapshot(*dst);
+        const auto before = snapshot(dst.get());
         LogCapture log;
         EXPECT_EQ(QKImage_drawImage(src.get(), dst.get(), c.x, c.y), QK_OK);
         EXPECT_EQ(log.lines(), (std::vector<LogLine>{{3, c.message}}));
-        EXPECT_TRUE(snapshot(*dst) == before);
+        EXPECT_TRUE(snapshot(dst.get()) == before);
     }
     // Being outside is decided before the format is looked at.
     ImagePtr grey = distinct_image(4, 4, QK_FORMAT_GREY);

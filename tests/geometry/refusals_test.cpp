@@ -6,7 +6,7 @@
 
 #include <vector>
 
-#include "geometry/images.h"
+#include "support/images.h"
 #include "qkcore/qk_image.h"
 #include "support/log_capture.h"
 
@@ -125,7 +125,7 @@ TEST(GeometryRefusals, ReportOnceAndLeaveTheImagesAlone) {
         SCOPED_TRACE(::testing::Message() << kFiles[c.op] << ": " << c.what);
         std::vector<uint8_t> src_bytes(64, 1), dst_bytes(64, 2);
         ImagePtr src = make(c.src, src_bytes), dst = make(c.dst, dst_bytes);
-        const auto src_before = snapshot(src ? *src : QKImage()), dst_before = snapshot(dst ? *dst : QKImage());
+        const auto src_before = snapshot(src.get()), dst_before = snapshot(dst.get());
         LogCapture log;
         const int32_t status = c.op == kRotate  ? QKImage_rotate(src.get(), c.x)
                                : c.op == kScale ? QKImage_scale(src.get(), dst.get())
@@ -137,8 +137,8 @@ TEST(GeometryRefusals, ReportOnceAndLeaveTheImagesAlone) {
         EXPECT_TRUE(c.message == nullptr || log.contains(4, c.message));
         // The level-3 message of turning through RGBA comes first.
         EXPECT_EQ(log.texts(3).size(), c.file == kConvertFile ? 1u : 0u);
-        EXPECT_TRUE(snapshot(src ? *src : QKImage()) == src_before);
-        EXPECT_TRUE(c.allocates ? dst->data != nullptr : snapshot(dst ? *dst : QKImage()) == dst_before);
+        EXPECT_TRUE(snapshot(src.get()) == src_before);
+        EXPECT_TRUE(c.allocates ? dst->data != nullptr : snapshot(dst.get()) == dst_before);
     }
 }
 

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "geometry/images.h"
+#include "support/images.h"
 #include "qkcore/qk_image.h"
 #include "support/log_capture.h"
 

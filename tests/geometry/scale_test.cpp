@@ -4,7 +4,7 @@
 
 #include <vector>
 
-#include "geometry/images.h"
+#include "support/images.h"
 #include "qkcore/qk_image.h"
 #include "support/log_capture.h"
 

@@ -1,7 +1,7 @@
 // Small images whose bytes all differ, and snapshots that show whether an
 // operation left an image alone.
-#ifndef QKCORE_TESTS_GEOMETRY_IMAGES_H
-#define QKCORE_TESTS_GEOMETRY_IMAGES_H
+#ifndef QKCORE_TESTS_SUPPORT_IMAGES_H
+#define QKCORE_TESTS_SUPPORT_IMAGES_H
 
 #include <stdint.h>
 #include <string.h>
@@ -59,12 +59,14 @@ inline ImagePtr numbered_rgba(int32_t width, int32_t height) {
     return image;
 }
 
-// Every field of an image and the bytes of its buffer.
-inline auto snapshot(const QKImage& image) {
+// Every field of an image and the bytes of its buffer; the same for every
+// null image.
+inline auto snapshot(const QKImage* image) {
+    static const QKImage none;
+    const QKImage& i = image != nullptr ? *image : none;
     std::vector<uint8_t> bytes;
-    if (image.data != nullptr) bytes.assign(image.data, image.data + QKImage_size(&image));
-    return std::make_tuple(image.data, image.width, image.height, image.format, image.isWrapped, image.size,
-                           image.chromaOffset, bytes);
+    if (i.data != nullptr) bytes.assign(i.data, i.data + QKImage_size(&i));
+    return std::make_tuple(i.data, i.width, i.height, i.format, i.isWrapped, i.size, i.chromaOffset, bytes);
 }
 
 inline bool is_yuv420(uint32_t f) {
@@ -99,4 +101,4 @@ constexpr uint32_t kDrawFormats[] = {QK_FORMAT_RGBA, QK_FORMAT_RGB8, QK_FORMAT_N
 
 }  // namespace qktest
 
-#endif  // QKCORE_TESTS_GEOMETRY_IMAGES_H
+#endif  // QKCORE_TESTS_SUPPORT_IMAGES_H
