@@ -4,8 +4,6 @@
 
 #include <algorithm>
 
-#include "convert/formulas.h"
-
 namespace qktest {
 
 const uint32_t kConvertibleFormats[13] = {
