@@ -85,40 +85,38 @@ TEST(Allocate, GivesAnImageWithoutBufferAnOwnedOne) {
     EXPECT_TRUE(log.lines().empty());
 }
 
+uint8_t some_byte;
+
 TEST(Image, RefusalsReportOnceAndChangeNothing) {
     using Call = int32_t (*)(QKImage*);
     const Call allocate = QKImage_allocate;
-    const Call wrap_byte = [](QKImage* image) {
-        static uint8_t byte;
-        return QKImage_wrap(image, &byte, 24, 0);
-    };
+    const Call wrap_byte = [](QKImage* image) { return QKImage_wrap(image, &some_byte, 24, 0); };
     const Call wrap_nothing = [](QKImage* image) { return QKImage_wrap(image, nullptr, 24, 0); };
     // Wrapping an image's own buffer would free what it then points at.
     const Call wrap_own = [](QKImage* image) { return QKImage_wrap(image, image->data, 24, 0); };
     constexpr int32_t NUL = QK_ERROR_NULL_PARAM, PARAM = QK_ERROR_INVALID_PARAM;
     const struct {
         Call call;
-        bool image, owned;  // an image at all; one with a buffer of its own
+        int image;  // 0: none, 1: without buffer, with the preset size; 2: with a buffer of its own
         uint32_t format;
-        int32_t width, height;
+        int32_t width;
         uint64_t preset;
         int32_t status;
     } cases[] = {
-        {allocate, false, false, QK_FORMAT_RGBA, 1, 1, 0, NUL},
-        {allocate, true, false, QK_FORMAT_JPEG, 10, 10, 0, PARAM},           // no size rule
-        {allocate, true, false, QK_FORMAT_RGBA, 0, 10, 0, PARAM},            // dimension below 1
-        {allocate, true, false, QK_FORMAT_RGBA, 10, 10, 1ull << 33, PARAM},  // not a 32-bit byte count
-        {allocate, true, false, QK_FORMAT_PCL, 1, 1, 3, QK_ERROR_INVALID_SIZE},  // no room for the point count
-        {wrap_byte, false, false, QK_FORMAT_NV12, 4, 4, 0, NUL},
-        {wrap_nothing, true, true, QK_FORMAT_NV12, 4, 4, 0, NUL},
-        {wrap_own, true, true, QK_FORMAT_NV12, 4, 4, 0, PARAM},
+        {allocate, 0, QK_FORMAT_RGBA, 1, 0, NUL},
+        {allocate, 1, QK_FORMAT_JPEG, 10, 0, PARAM},                         // no size rule
+        {allocate, 1, QK_FORMAT_RGBA, 0, 0, PARAM},                          // dimension below 1
+        {allocate, 1, QK_FORMAT_RGBA, 10, 1ull << 33, PARAM},                // not a 32-bit byte count
+        {allocate, 1, QK_FORMAT_PCL, 1, 3, QK_ERROR_INVALID_SIZE},           // no room for the point count
+        {wrap_byte, 0, QK_FORMAT_NV12, 4, 0, NUL},
+        {wrap_nothing, 2, QK_FORMAT_NV12, 4, 0, NUL},
+        {wrap_own, 2, QK_FORMAT_NV12, 4, 0, PARAM},
     };
     for (const auto& c : cases) {
-        ImagePtr image(!c.image ? nullptr
-                       : c.owned ? QKImage_createNew(c.width, c.height, c.format)
-                                 : QKImage_createEmpty(c.width, c.height, c.format));
-        if (c.image && !c.owned) image->size = c.preset;
-        if (c.image) image->chromaOffset = 7;
+        ImagePtr image(c.image == 0   ? nullptr
+                       : c.image == 1 ? QKImage_createEmpty(c.width, 1, c.format)
+                                      : QKImage_createNew(c.width, 4, c.format));
+        if (c.image == 1) image->size = c.preset, image->chromaOffset = 7;
         const auto before = snapshot(image.get());
         LogCapture log;
         EXPECT_EQ(c.call(image.get()), c.status);

@@ -10,29 +10,26 @@ namespace {
 
 const QKOptionEnum_t kModes[] = {{0, "auto"}, {1, "on"}, {2, "off"}, {QK_OPTION_ENUM_END, "never read"}};
 
+// Both bounds 0 take every value (-0 counting as 0); otherwise min <= value
+// <= max, compared as signed integers or floats, and NaN fails.
 TEST(OptionValues, Ranges) {
-    struct IntCase {
-        int32_t min, max, value, passes;
-    } ints[] = {
-        {0, 0, -5, 1}, {0, 0, INT32_MIN, 1},  // no range
-        {1, 10, 1, 1}, {1, 10, 10, 1}, {1, 10, 0, 0}, {1, 10, 11, 0}, {10, 1, 5, 0},
-        {-10, -1, -10, 1}, {-10, -1, 0, 0}, {0, 5, -1, 0},  // signed comparison
-    };
-    for (const IntCase& c : ints) {
-        QKOption_t option = {0, "i", QK_OPTION_INTEGER, c.min, c.max, nullptr};
-        EXPECT_EQ(QKOption_CheckValueI(&option, c.value), c.passes) << c.min << ".." << c.max << " " << c.value;
-    }
-    struct FloatCase {
-        float min, max, value;
+    constexpr uint32_t I = QK_OPTION_INTEGER, F = QK_OPTION_FLOAT;
+    const struct {
+        uint32_t type;
+        QKOptionBound_t min, max;
+        double value;
         int32_t passes;
-    } floats[] = {
-        {-2.0f, 2.0f, 2.0f, 1}, {-2.0f, 2.0f, -2.0f, 1}, {-2.0f, 2.0f, 2.5f, 0}, {-2.0f, 2.0f, NAN, 0},
-        {0.0f, 0.0f, NAN, 1}, {-0.0f, 0.0f, 7.0f, 1},  // no range, -0 counting as 0
-        {0.5f, 0.25f, 0.3f, 0},
+    } cases[] = {
+        {I, 0, 0, -5, 1},   {I, 0, 0, INT32_MIN, 1}, {I, 1, 10, 1, 1},     {I, 1, 10, 10, 1},   {I, 1, 10, 0, 0},
+        {I, 1, 10, 11, 0},  {I, 10, 1, 5, 0},        {I, -10, -1, -10, 1}, {I, -10, -1, 0, 0},  {I, 0, 5, -1, 0},
+        {F, -2.0f, 2.0f, 2, 1},   {F, -2.0f, 2.0f, -2, 1},  {F, -2.0f, 2.0f, 2.5, 0}, {F, -2.0f, 2.0f, NAN, 0},
+        {F, 0.0f, 0.0f, NAN, 1},  {F, -0.0f, 0.0f, 7, 1},   {F, 0.5f, 0.25f, 0.3, 0},
     };
-    for (const FloatCase& c : floats) {
-        QKOption_t option = {0, "f", QK_OPTION_FLOAT, c.min, c.max, nullptr};
-        EXPECT_EQ(QKOption_CheckValueF(&option, c.value), c.passes) << c.min << ".." << c.max << " " << c.value;
+    for (const auto& c : cases) {
+        const QKOption_t o = {0, "o", c.type, c.min, c.max, nullptr};
+        EXPECT_EQ(c.type == I ? QKOption_CheckValueI(&o, int32_t(c.value)) : QKOption_CheckValueF(&o, float(c.value)),
+                  c.passes)
+            << "case " << &c - cases;
     }
 }
 
