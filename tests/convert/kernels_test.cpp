@@ -1,12 +1,14 @@
-// The row kernels: their colour arithmetic against the plain formulas over
-// the whole input domain (all 2^24 RGB colours and all 2^24 (Y, U, V)), and
-// every faster variant against its reference kernel: same random input, every
-// layout it is chosen for, widths that leave tails, and a guard zone after the
-// output that neither may touch.
+// The row kernels: every faster variant against its reference kernel for
+// every layout it is chosen for, and their colour arithmetic against the
+// plain formulas over the whole input domain (all 2^24 RGB colours and all
+// 2^24 (Y, U, V)).
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <functional>
 #include <random>
+#include <string>
+#include <tuple>
 #include <vector>
 
 #include "convert/layout.h"
@@ -18,125 +20,94 @@ namespace {
 using qktest::formula_rgb_to_yuv;
 using qktest::formula_yuv_to_rgb;
 using namespace qk;
-using ::testing::Message;
 
-const int kWidths[] = {0, 1, 2, 7, 8, 17, 34, 67};
-std::mt19937 random_source(1);
+// A kernel under test: the bytes it writes for `width` pixels, and a run of
+// its reference (true) or of the variant chosen for it (false) from `in`,
+// whose first 1024 bytes may hold luma and the next two 1024 U and V.
+struct Kernel {
+    std::string name;
+    std::function<size_t(int width)> out_bytes;
+    std::function<void(bool reference, int width, uint8_t* in, uint8_t* out)> run;
+};
 
-std::vector<uint8_t> random_bytes(size_t count) {
-    std::vector<uint8_t> bytes(count);
-    for (uint8_t& byte : bytes) byte = static_cast<uint8_t>(random_source());
-    return bytes;
-}
-
-// Runs `write(reference?, out)` into two equally prefilled buffers with 16
-// guard bytes and compares every byte.
-template <typename Write>
-void expect_same_bytes(size_t outBytes, Write write) {
-    std::vector<uint8_t> want(outBytes + 16, 0xC3), got(outBytes + 16, 0xC3);
-    write(true, want.data());
-    write(false, got.data());
-    EXPECT_EQ(got, want);
-}
-
-TEST(RowVariants, RgbToRgbAndGreyToRgb) {
+std::vector<Kernel> every_kernel() {
+    std::vector<Kernel> all;
+    auto add = [&all](const std::string& name, auto out_bytes, auto run) { all.push_back({name, out_bytes, run}); };
     for (int s = 0; s < kRgbFormatCount; ++s) {
-        const GreyToRgbRow grey = select_grey_to_rgb_row(s);
-        for (int width : kWidths) {
-            SCOPED_TRACE(Message() << "grey to " << s << ", width " << width);
-            const std::vector<uint8_t> luma = random_bytes(width);
-            expect_same_bytes(width * kRgbLayouts[s].bytesPerPixel, [&](bool reference, uint8_t* out) {
-                (reference ? grey_to_rgb_row_reference : grey)(luma.data(), out, width, kRgbLayouts[s]);
+        const RgbLayout rgb = kRgbLayouts[s];
+        const std::string from = std::to_string(s);
+        add("grey to " + from, [=](int w) { return size_t(w) * rgb.bytesPerPixel; },
+            [=](bool ref, int w, uint8_t* in, uint8_t* out) {
+                (ref ? grey_to_rgb_row_reference : select_grey_to_rgb_row(s))(in, out, w, rgb);
             });
-        }
         for (int d = 0; d < kRgbFormatCount; ++d) {
-            const RgbToRgbShape shape{kRgbLayouts[s], kRgbLayouts[d]};
-            const RgbToRgbRow fast = select_rgb_to_rgb_row(s, d);
-            for (int width : kWidths) {
-                SCOPED_TRACE(Message() << s << " to " << d << ", width " << width);
-                const std::vector<uint8_t> in = random_bytes(width * shape.src.bytesPerPixel);
-                expect_same_bytes(width * shape.dst.bytesPerPixel, [&](bool reference, uint8_t* out) {
-                    (reference ? rgb_to_rgb_row_reference : fast)(in.data(), out, width, shape);
+            const RgbToRgbShape shape{rgb, kRgbLayouts[d]};
+            add(from + " to " + std::to_string(d), [=](int w) { return size_t(w) * shape.dst.bytesPerPixel; },
+                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
+                    (ref ? rgb_to_rgb_row_reference : select_rgb_to_rgb_row(s, d))(in, out, w, shape);
                 });
-            }
         }
-    }
-}
-
-TEST(RowVariants, RgbToLumaAndChroma) {
-    for (int s = 0; s < kRgbFormatCount; ++s) {
         for (int step : {1, 2, 4}) {
-            const RgbToYuvShape shape{kRgbLayouts[s], step, step};
-            for (int width : kWidths) {
-                SCOPED_TRACE(Message() << s << ", step " << step << ", width " << width);
-                const std::vector<uint8_t> in = random_bytes(width * shape.src.bytesPerPixel);
-                if (step != 4) {
-                    const RgbToLumaRow fast = select_rgb_to_luma_row(s, step);
-                    expect_same_bytes(width * step, [&](bool reference, uint8_t* out) {
-                        (reference ? rgb_to_luma_row_reference : fast)(in.data(), out, width, shape);
+            const RgbToYuvShape shape{rgb, step, step};
+            const std::string name = from + " to step " + std::to_string(step);
+            if (step != 4) {
+                add(name + " luma", [=](int w) { return size_t(w) * step; },
+                    [=](bool ref, int w, uint8_t* in, uint8_t* out) {
+                        (ref ? rgb_to_luma_row_reference : select_rgb_to_luma_row(s, step))(in, out, w, shape);
                     });
-                }
-                const RgbToChromaRow fast = select_rgb_to_chroma_row(s, step);
-                const int pairs = width / 2;
-                expect_same_bytes(2 * pairs * step, [&](bool reference, uint8_t* out) {
-                    (reference ? rgb_to_chroma_row_reference : fast)(in.data(), out, out + pairs * step, pairs,
-                                                                     shape);
-                });
             }
+            add(name + " chroma", [=](int w) { return size_t(w / 2) * 2 * step; },
+                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
+                    (ref ? rgb_to_chroma_row_reference : select_rgb_to_chroma_row(s, step))(
+                        in, out, out + w / 2 * step, w / 2, shape);
+                });
+        }
+        // Even widths only; one chroma pair whose pixels take the double path.
+        for (auto [lumaStep, chromaStep, rows] : {std::tuple{1, 1, 2}, {1, 2, 2}, {2, 4, 1}}) {
+            const YuvToRgbShape shape{lumaStep, chromaStep, rows, rgb};
+            add("YUV step " + std::to_string(chromaStep) + " to " + from,
+                [=](int w) { return size_t(w / 2) * 4 * rgb.bytesPerPixel; },
+                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
+                    const int even = w / 2 * 2;
+                    in[1024 + chromaStep] = 28, in[2048 + chromaStep] = 228;
+                    (ref ? yuv_to_rgb_row_reference : select_yuv_to_rgb_row(s, lumaStep, chromaStep, rows))(
+                        in, rows == 2 ? in + even : nullptr, in + 1024, in + 2048, out,
+                        rows == 2 ? out + even * rgb.bytesPerPixel : nullptr, even, shape);
+                });
         }
     }
-}
-
-TEST(RowVariants, YuvToRgb) {
-    struct Source {
-        int lumaStep, chromaStep, rows;
-    };
-    for (int d = 0; d < kRgbFormatCount; ++d) {
-        for (Source source : {Source{1, 1, 2}, Source{1, 2, 2}, Source{2, 4, 1}}) {
-            const YuvToRgbShape shape{source.lumaStep, source.chromaStep, source.rows, kRgbLayouts[d]};
-            const YuvToRgbRow fast = select_yuv_to_rgb_row(d, source.lumaStep, source.chromaStep, source.rows);
-            for (int width : kWidths) {
-                if (width % 2 != 0) continue;
-                SCOPED_TRACE(Message() << d << ", chroma step " << source.chromaStep << ", width " << width);
-                const std::vector<uint8_t> luma = random_bytes(2 * width * source.lumaStep);
-                std::vector<uint8_t> u = random_bytes(width / 2 * source.chromaStep), v = u;
-                for (uint8_t& byte : v) byte = static_cast<uint8_t>(random_source());
-                if (width >= 4) {
-                    // The one chroma pair whose pixels take the double path.
-                    u[source.chromaStep] = 28;
-                    v[source.chromaStep] = 228;
-                }
-                const size_t rowBytes = width * shape.dst.bytesPerPixel;
-                expect_same_bytes(2 * rowBytes, [&](bool reference, uint8_t* out) {
-                    const uint8_t* y1 = source.rows == 2 ? luma.data() + width : nullptr;
-                    uint8_t* d1 = source.rows == 2 ? out + rowBytes : nullptr;
-                    (reference ? yuv_to_rgb_row_reference : fast)(luma.data(), y1, u.data(), v.data(), out, d1,
-                                                                  width, shape);
-                });
-            }
-        }
-    }
-}
-
-TEST(RowVariants, SamplesAndChromaBetweenSteps) {
     for (int from : {1, 2, 4}) {
         for (int to : {1, 2, 4}) {
-            for (int count : kWidths) {
-                SCOPED_TRACE(Message() << from << " to " << to << ", count " << count);
-                const std::vector<uint8_t> in = random_bytes(count * from + 1);
-                if (from != 4 && to != 4) {
-                    const SampleRow fast = select_sample_row(from, to);
-                    expect_same_bytes(count * to, [&](bool reference, uint8_t* out) {
-                        (reference ? sample_row_reference : fast)(in.data(), from, out, to, count);
+            const std::string name = std::to_string(from) + " to " + std::to_string(to);
+            if (from != 4 && to != 4) {
+                add("samples " + name, [=](int w) { return size_t(w) * to; },
+                    [=](bool ref, int w, uint8_t* in, uint8_t* out) {
+                        (ref ? sample_row_reference : select_sample_row(from, to))(in, from, out, to, w);
                     });
-                }
-                const ChromaRow fast = select_chroma_row(from, to);
-                // V before U on the source side, U before V on the other.
-                expect_same_bytes(2 * count * to, [&](bool reference, uint8_t* out) {
-                    (reference ? chroma_row_reference : fast)(in.data() + 1, in.data(), from, out, out + count * to,
-                                                              to, count);
-                });
             }
+            // V before U on the source side, U before V on the other.
+            add("chroma " + name, [=](int w) { return size_t(w) * 2 * to; },
+                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
+                    const ChromaRow row = ref ? chroma_row_reference : select_chroma_row(from, to);
+                    row(in + 1, in, from, out, out + w * to, to, w);
+                });
+        }
+    }
+    return all;
+}
+
+// Same random input, widths that leave tails, and 16 guard bytes after the
+// output that neither kernel may touch.
+TEST(RowVariants, EveryVariantWritesExactlyTheBytesOfItsReference) {
+    std::mt19937 random(1);
+    for (const Kernel& kernel : every_kernel()) {
+        for (int width : {0, 1, 2, 7, 8, 17, 34, 67}) {
+            std::vector<uint8_t> in(3072);
+            for (uint8_t& byte : in) byte = static_cast<uint8_t>(random());
+            std::vector<uint8_t> want(kernel.out_bytes(width) + 16, 0xC3), got = want;
+            kernel.run(true, width, in.data(), want.data());
+            kernel.run(false, width, in.data(), got.data());
+            EXPECT_EQ(got, want) << kernel.name << ", width " << width;
         }
     }
 }
