@@ -125,29 +125,18 @@ TEST(Image, RefusalsReportOnceAndChangeNothing) {
     }
 }
 
-TEST(Release, DeallocateKeepsTheHeaderAndResetKeepsTheSize) {
+// Deallocation keeps the header; reset without a buffer clears only width,
+// height and format; wrapping frees an owned buffer (a leak otherwise) and
+// reports the recorded size or else the rule size, silently.
+TEST(Release, DeallocateResetAndWrap) {
+    LogCapture log;
     ImagePtr image(QKImage_createNew(4, 4, QK_FORMAT_NV12));
     image->chromaOffset = 16;
     QKImage_deallocate(image.get());
     EXPECT_EQ(image->data, nullptr);
     EXPECT_EQ(image->size + image->chromaOffset, 0u);
-    EXPECT_EQ(QKImage_allocate(image.get()), 24);  // the header is still whole
-
-    // Without a buffer, reset clears only width, height and format.
-    ImagePtr bare(QKImage_createEmpty(10, 10, QK_FORMAT_RGBA));
-    bare->size = 500;
-    QKImage_reset(bare.get());
-    EXPECT_EQ(std::make_tuple(bare->width, bare->height, bare->format, bare->size), std::make_tuple(0, 0, 0u, 500ul));
-
-    QKImage_deallocate(nullptr);
-    QKImage_reset(nullptr);
-    QKImage_destroy(nullptr);
-}
-
-TEST(Wrap, AdoptsTheCallersBufferAndFreesAnOwnedOne) {
-    LogCapture log;
+    EXPECT_EQ(QKImage_allocate(image.get()), 24);
     std::vector<uint8_t> pixels(100);
-    ImagePtr image(QKImage_createNew(4, 4, QK_FORMAT_NV12));  // owned buffer, freed by wrap
     EXPECT_EQ(QKImage_wrap(image.get(), pixels.data(), 0, 0), 24);
     EXPECT_EQ(image->isWrapped, 1u);
     EXPECT_EQ(QKImage_wrap(image.get(), pixels.data(), 100, 32), 100);
@@ -156,7 +145,14 @@ TEST(Wrap, AdoptsTheCallersBufferAndFreesAnOwnedOne) {
     EXPECT_EQ(image->size, 0u);
 
     ImagePtr jpeg(QKImage_createEmpty(4, 4, QK_FORMAT_JPEG));
-    EXPECT_EQ(QKImage_wrap(jpeg.get(), pixels.data(), 0, 0), 0);  // no rule size, no report
+    EXPECT_EQ(QKImage_wrap(jpeg.get(), pixels.data(), 0, 0), 0);  // no rule size
+    ImagePtr bare(QKImage_createEmpty(10, 10, QK_FORMAT_RGBA));
+    bare->size = 500;
+    QKImage_reset(bare.get());
+    EXPECT_EQ(std::make_tuple(bare->width, bare->height, bare->format, bare->size), std::make_tuple(0, 0, 0u, 500ul));
+    QKImage_deallocate(nullptr);
+    QKImage_reset(nullptr);
+    QKImage_destroy(nullptr);
     EXPECT_TRUE(log.lines().empty());
 }
 

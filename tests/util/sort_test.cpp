@@ -18,40 +18,33 @@ TEST(Sort, OrdersTheRangeDescendingAndMovesNamesByContent) {
         const size_t count = 1 + random() % 300;
         std::vector<int32_t> keys(count);
         std::vector<std::vector<char>> buffers(count, std::vector<char>(256, '\x7f'));
-        std::vector<std::string> original(count);
+        std::vector<std::string> original(count), now(count);
         std::vector<char*> names(count);
         for (size_t i = 0; i < count; ++i) {
             keys[i] = static_cast<int32_t>(random() % 40) - 20;
             original[i] = std::to_string(keys[i]) + "_" + std::to_string(i);
-            strcpy(buffers[i].data(), original[i].c_str());
-            names[i] = buffers[i].data();
+            names[i] = strcpy(buffers[i].data(), original[i].c_str());
         }
         const std::vector<char*> pointers = names;
-        const int32_t first = static_cast<int32_t>(random() % count);
-        const int32_t last = static_cast<int32_t>(first + random() % (count - first));
-        sort(keys.data(), names.data(), first, last);
+        const size_t first = random() % count, last = first + random() % (count - first);
+        sort(keys.data(), names.data(), int32_t(first), int32_t(last));
 
         EXPECT_TRUE(std::is_sorted(keys.begin() + first, keys.begin() + last + 1, std::greater<>()));
         EXPECT_EQ(names, pointers);  // names move by content only
-        std::vector<std::string> now(count), before = original;
         for (size_t i = 0; i < count; ++i) {
             now[i] = buffers[i].data();
-            // Each name sits with its own key; outside the range nothing moved.
+            // Each name sits with its own key; outside the range nothing moved;
+            // a moved name is written over the whole buffer, zero-filled.
             EXPECT_EQ(now[i].substr(0, now[i].find('_')), std::to_string(keys[i]));
-            const bool outside = static_cast<int32_t>(i) < first || static_cast<int32_t>(i) > last;
-            EXPECT_TRUE(!outside || now[i] == original[i]) << now[i] << " moved out of the range";
-            // A moved name is written over the whole buffer, zero-filled.
-            if (now[i] != original[i]) {
-                EXPECT_EQ(std::count(buffers[i].begin(), buffers[i].end(), 0), 256 - long(now[i].size()));
-            }
+            EXPECT_TRUE((i >= first && i <= last) || now[i] == original[i]) << now[i] << " left the range";
+            const long zeros = std::count(buffers[i].begin(), buffers[i].end(), 0);
+            EXPECT_TRUE(now[i] == original[i] || zeros == 256 - long(now[i].size())) << now[i];
         }
         std::sort(now.begin(), now.end());
-        std::sort(before.begin(), before.end());
-        EXPECT_EQ(now, before);  // no name lost or doubled
+        std::sort(original.begin(), original.end());
+        EXPECT_EQ(now, original);  // no name lost or doubled
     }
-}
-
-TEST(Sort, EmptyAndSingleRangesTouchNothing) {
+    // Empty and single ranges touch nothing, not even the names.
     int32_t keys[] = {5, 1, 7};
     sort(keys, nullptr, 1, 1);
     sort(keys, nullptr, 2, 0);
@@ -69,10 +62,8 @@ TEST(Swap, ExchangesKeysAndWholeNameBuffers) {
     EXPECT_EQ(a * 10 + b, 21);
     EXPECT_STREQ(name_a, "second");
     EXPECT_STREQ(name_b, "first");
-    // The bounded copies zero-fill the rest of each buffer.
-    EXPECT_EQ(name_a[255] | name_b[255], 0);
-
-    swap(&a, &a, name_a, name_a);  // one element with itself
+    EXPECT_EQ(name_a[255] | name_b[255], 0);  // the bounded copies zero-fill the rest
+    swap(&a, &a, name_a, name_a);             // one element with itself
     EXPECT_STREQ(name_a, "second");
 }
 
