@@ -156,97 +156,73 @@ TEST(Scale, DestinationSharingTheSourceBuffer) {
     }
 }
 
-// Each destination pixel holds what the source pixel it was cut from holds,
-// each image addressed through its own chroma base. A destination without
-// buffer gets one of its rule size.
-TEST(Crop, CopiesTheRectangleOutOfAnyPackedOr420Image) {
+// Crop cuts the destination's rectangle out of the source at (x, y); draw
+// puts the source into the destination at (x, y), clipped. Each pixel then
+// holds what the pixel it came from holds, the others keep theirs, each image
+// addressed through its own chroma base (4:2:0 chroma past a padded luma
+// plane where an offset is given). A crop destination without buffer gets
+// one of its rule size.
+TEST(CropAndDraw, MovePixelsBetweenImagesOfOneFormat) {
     const struct {
-        int32_t x, y, w, h;
+        bool crop;
+        int32_t sw, sh, dw, dh, x, y;
         uint32_t src_chroma, dst_chroma;  // 4:2:0 only
     } cases[] = {
-        {0, 0, 8, 8, 0, 0},   // the whole frame: a byte-exact copy
-        {2, 4, 4, 4, 0, 0},  {6, 6, 2, 2, 0, 0},  // touching the right and bottom edges
-        {4, 2, 4, 4, 80, 0},  // padded source luma plane
-        {2, 2, 4, 4, 0, 20},  // destination chroma at its own offset
-        {1, 3, 5, 3, 0, 0},  {5, 0, 3, 8, 0, 0},  // odd places and sizes: packed formats only
+        {true, 8, 8, 8, 8, 0, 0, 0, 0},  // the whole frame: a byte-exact copy
+        {true, 8, 8, 4, 4, 2, 4, 0, 0},   {true, 8, 8, 2, 2, 6, 6, 0, 0},  // touching the right and bottom edges
+        {true, 8, 8, 4, 4, 4, 2, 80, 0},  {true, 8, 8, 4, 4, 2, 2, 0, 20},
+        {true, 8, 8, 5, 3, 1, 3, 0, 0},   {true, 8, 8, 3, 8, 5, 0, 0, 0},  // odd places and sizes: packed only
+        // A 6x8 source on an 8x4 destination: inside, at negative offsets,
+        // overhanging one edge or both.
+        {false, 6, 8, 8, 4, 0, 0, 56, 0},  {false, 6, 8, 8, 4, 2, 0, 56, 40},  {false, 6, 8, 8, 4, -2, -2, 56, 0},
+        {false, 6, 8, 8, 4, 4, -4, 0, 40}, {false, 6, 8, 8, 4, -4, 2, 56, 40}, {false, 6, 8, 8, 4, 6, 2, 0, 0},
+        {false, 6, 8, 8, 4, 0, -4, 56, 40}, {false, 6, 8, 8, 4, 1, -1, 0, 0},  {false, 6, 8, 8, 4, -3, 1, 0, 0},
+        {false, 6, 8, 8, 4, 7, 3, 0, 0},
     };
     for (uint32_t format : kDrawFormats) {
-        for (const auto& c : cases) {
-            const bool yuv = is_yuv420(format);
-            if (yuv && (c.x % 2 != 0 || c.w % 2 != 0 || c.h % 2 != 0)) continue;
-            SCOPED_TRACE(::testing::Message() << fourcc(format) << " " << c.w << "x" << c.h << " at " << c.x << ","
-                                              << c.y);
-            const uint32_t src_chroma = yuv ? c.src_chroma : 0, dst_chroma = yuv ? c.dst_chroma : 0;
-            std::vector<uint8_t> src_bytes(src_chroma != 0 ? src_chroma + 32 : QKImage_requiredSize(8, 8, format));
-            std::vector<uint8_t> dst_bytes(dst_chroma + c.w * c.h / 2);
-            ImagePtr src(QKImage_createWrap(src_bytes.data(), 8, 8, format, int32_t(src_bytes.size()), src_chroma));
-            fill_distinct(*src);
-            ImagePtr dst(QKImage_createWrap(dst_chroma != 0 ? dst_bytes.data() : nullptr, c.w, c.h, format,
-                                            int32_t(dst_bytes.size()), dst_chroma));
-            LogCapture log;
-            ASSERT_EQ(QKImage_crop(src.get(), dst.get(), c.x, c.y), QK_OK);
-            EXPECT_TRUE(log.lines().empty());
-            EXPECT_TRUE(dst_chroma != 0 || dst->size == QKImage_requiredSize(c.w, c.h, format));
-            for (int32_t r = 0; r < c.h; ++r) {
-                for (int32_t col = 0; col < c.w; ++col) {
-                    ASSERT_EQ(pixel_bytes(*dst, col, r), pixel_bytes(*src, c.x + col, c.y + r)) << col << "," << r;
-                }
-            }
-            EXPECT_TRUE(c.w != 8 || c.h != 8 || memcmp(dst->data, src->data, dst->size) == 0);
-        }
-    }
-}
-
-struct Offset {
-    int32_t x, y;
-};
-
-// A 6x8 source on an 8x4 destination: inside, at negative offsets, and
-// overhanging one edge or both. Pixels under the source show its pixels, the
-// others keep theirs, each image addressed through its own chroma base.
-TEST(Draw, OverlapIsOverwritten) {
-    const Offset offsets[] = {{0, 0}, {2, 0}, {-2, -2}, {4, -4}, {-4, 2}, {6, 2}, {0, -4}, {1, -1}, {-3, 1}, {7, 3}};
-    for (uint32_t format : kDrawFormats) {
         const bool yuv = is_yuv420(format);
-        for (uint32_t dst_chroma : {0u, 40u}) {
-            for (const Offset& o : offsets) {
-                if (yuv ? (o.x % 2 != 0 || o.y % 2 != 0) : dst_chroma != 0) continue;
-                SCOPED_TRACE(::testing::Message() << fourcc(format) << " at " << o.x << "," << o.y << " chroma "
-                                                  << dst_chroma);
-                // 4:2:0 sources keep their chroma past a padded luma plane.
-                std::vector<uint8_t> src_bytes(QKImage_requiredSize(6, 8, format) + 8), dst_bytes(256);
-                ImagePtr src(QKImage_createWrap(src_bytes.data(), 6, 8, format, int32_t(src_bytes.size()),
-                                                yuv ? 56 : 0));
-                fill_distinct(*src, 11);
-                ImagePtr dst(QKImage_createWrap(dst_bytes.data(), 8, 4, format, dst_chroma != 0 ? 56 : 0, dst_chroma));
-                fill_distinct(*dst, 200);
-                ImagePtr before(QKImage_clone(dst.get()));
-                LogCapture log;
-                ASSERT_EQ(QKImage_drawImage(src.get(), dst.get(), o.x, o.y), QK_OK);
-                EXPECT_TRUE(log.lines().empty());
-                for (int32_t r = 0; r < 4; ++r) {
-                    for (int32_t c = 0; c < 8; ++c) {
-                        const int32_t sx = c - o.x, sy = r - o.y;
-                        const bool inside = sx >= 0 && sx < 6 && sy >= 0 && sy < 8;
-                        const QKImage& shown = inside ? *src : *before;
-                        ASSERT_EQ(pixel_bytes(*dst, c, r), pixel_bytes(shown, inside ? sx : c, inside ? sy : r))
-                            << c << "," << r;
-                    }
+        for (const auto& c : cases) {
+            if (yuv && (c.x % 2 != 0 || c.y % 2 != 0 || c.dw % 2 != 0 || c.dh % 2 != 0)) continue;
+            SCOPED_TRACE(::testing::Message() << (c.crop ? "crop " : "draw ") << fourcc(format) << " " << c.dw << "x"
+                                              << c.dh << " at " << c.x << "," << c.y);
+            const uint32_t sc = yuv ? c.src_chroma : 0, dc = yuv ? c.dst_chroma : 0;
+            std::vector<uint8_t> src_bytes(sc != 0 ? sc + c.sw * c.sh / 2 : QKImage_requiredSize(c.sw, c.sh, format));
+            std::vector<uint8_t> dst_bytes(256);
+            ImagePtr src(QKImage_createWrap(src_bytes.data(), c.sw, c.sh, format, int32_t(src_bytes.size()), sc));
+            fill_distinct(*src, 11);
+            const bool bare = c.crop && dc == 0;
+            ImagePtr dst(QKImage_createWrap(bare ? nullptr : dst_bytes.data(), c.dw, c.dh, format,
+                                            dc != 0 ? dc + c.dw * c.dh / 2 : 0, dc));
+            if (!bare) fill_distinct(*dst, 200);
+            ImagePtr before(bare ? nullptr : QKImage_clone(dst.get()));
+            LogCapture log;
+            ASSERT_EQ(c.crop ? QKImage_crop(src.get(), dst.get(), c.x, c.y)
+                             : QKImage_drawImage(src.get(), dst.get(), c.x, c.y),
+                      QK_OK);
+            EXPECT_TRUE(log.lines().empty());
+            EXPECT_TRUE(!bare || dst->size == QKImage_requiredSize(c.dw, c.dh, format));
+            for (int32_t r = 0; r < c.dh; ++r) {
+                for (int32_t col = 0; col < c.dw; ++col) {
+                    const int32_t sx = c.crop ? col + c.x : col - c.x, sy = c.crop ? r + c.y : r - c.y;
+                    const bool inside = sx >= 0 && sx < c.sw && sy >= 0 && sy < c.sh;
+                    const auto expected = inside ? pixel_bytes(*src, sx, sy) : pixel_bytes(*before, col, r);
+                    ASSERT_EQ(pixel_bytes(*dst, col, r), expected) << col << "," << r;
                 }
             }
+            EXPECT_TRUE(!c.crop || c.dw != 8 || c.dh != 8 || memcmp(dst->data, src->data, dst->size) == 0);
         }
     }
 }
 
 // Drawing an image into itself reads every row before overwriting it.
 TEST(Draw, IntoItself) {
-    for (const Offset& o : {Offset{1, 1}, Offset{-1, -2}, Offset{2, -1}, Offset{-2, 1}}) {
+    for (auto [x, y] : {std::pair{1, 1}, {-1, -2}, {2, -1}, {-2, 1}}) {
         ImagePtr image = distinct_image(5, 4, QK_FORMAT_RGB8);
         ImagePtr copy(QKImage_clone(image.get()));
         ImagePtr expected(QKImage_clone(image.get()));
-        ASSERT_EQ(QKImage_drawImage(copy.get(), expected.get(), o.x, o.y), QK_OK);
-        ASSERT_EQ(QKImage_drawImage(image.get(), image.get(), o.x, o.y), QK_OK);
-        EXPECT_EQ(0, memcmp(image->data, expected->data, 60)) << o.x << "," << o.y;
+        ASSERT_EQ(QKImage_drawImage(copy.get(), expected.get(), x, y), QK_OK);
+        ASSERT_EQ(QKImage_drawImage(image.get(), image.get(), x, y), QK_OK);
+        EXPECT_EQ(0, memcmp(image->data, expected->data, 60)) << x << "," << y;
     }
 }
 
