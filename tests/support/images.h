@@ -48,14 +48,13 @@ inline uint32_t pixel_at(const QKImage& image, int32_t x, int32_t y) {
     return value;
 }
 
-inline void set_pixel(QKImage& image, int32_t x, int32_t y, uint32_t value) {
-    memcpy(image.data + (static_cast<size_t>(y) * image.width + x) * 4, &value, 4);
-}
-
 // An RGBA image whose pixel (x, y) is rgba_pixel(y * width + x).
 inline ImagePtr numbered_rgba(int32_t width, int32_t height) {
     ImagePtr image(QKImage_createNew(width, height, QK_FORMAT_RGBA));
-    for (int32_t i = 0; i < width * height; ++i) set_pixel(*image, i % width, i / width, rgba_pixel(i));
+    for (int32_t i = 0; i < width * height; ++i) {
+        const uint32_t pixel = rgba_pixel(i);
+        memcpy(image->data + 4 * i, &pixel, 4);
+    }
     return image;
 }
 
