@@ -40,7 +40,8 @@ TEST_F(TimeStatTest, ExitMessageSwitchesToWholeMillisecondsAbove5ms) {
 
 TEST_F(TimeStatTest, EntryMessagesOnlyWhenEnabledAndNoExitWithoutName) {
     {
-        TimeStat probe("cam", "decode", 12, true), plain("scale", true), quiet("quiet", false), nameless(nullptr, false);
+        TimeStat probe("cam", "decode", 12, true), plain("scale", true);
+        TimeStat quiet("quiet", false), nameless(nullptr, false);
         EXPECT_EQ(log.texts(1), (Lines{"[cam] decode:12: Entry", "[velcamera] scale: Entry"}));
         log.clear();
     }
