@@ -12,57 +12,27 @@
 namespace {
 
 const std::set<std::string> kDocumented = {
-    // Logging and timing.
-    "HX_LogMsg",
-    "_Z13AndroidLogMsgiz",              // AndroidLogMsg(int, ...)
-    "_Z13DefaultLogMsgiz",              // DefaultLogMsg(int, ...)
-    "_ZN8TimeStatC1EPKcb",              // TimeStat::TimeStat(const char*, bool)
-    "_ZN8TimeStatC2EPKcb",
-    "_ZN8TimeStatC1EPKcS1_ib",          // TimeStat::TimeStat(const char*, const char*, int, bool)
-    "_ZN8TimeStatC2EPKcS1_ib",
-    "_ZN8TimeStatD1Ev",                 // TimeStat::~TimeStat()
-    "_ZN8TimeStatD2Ev",
-    "_ZN8TimeStatclEv",                 // TimeStat::operator()()
-    "_ZN8TimeStat9TimeStampEPKc",       // TimeStat::TimeStamp(const char*)
-    // Utilities.
-    "_Z4sortPiPPcii",                   // sort(int*, char**, int, int)
-    "_Z4swapPiS_PcS0_",                 // swap(int*, int*, char*, char*)
+    // Logging and timing: AndroidLogMsg(int, ...), DefaultLogMsg(int, ...),
+    // TimeStat's constructors (const char*, bool) and (const char*, const char*,
+    // int, bool), destructor, operator()() and TimeStamp(const char*).
+    "HX_LogMsg", "_Z13AndroidLogMsgiz", "_Z13DefaultLogMsgiz", "_ZN8TimeStatC1EPKcb", "_ZN8TimeStatC2EPKcb",
+    "_ZN8TimeStatC1EPKcS1_ib", "_ZN8TimeStatC2EPKcS1_ib", "_ZN8TimeStatD1Ev", "_ZN8TimeStatD2Ev",
+    "_ZN8TimeStatclEv", "_ZN8TimeStat9TimeStampEPKc",
+    // Utilities: sort(int*, char**, int, int), swap(int*, int*, char*, char*).
+    "_Z4sortPiPPcii", "_Z4swapPiS_PcS0_",
     // Images.
-    "QKImage_requiredSize",
-    "QKImage_size",
-    "QKImage_createEmpty",
-    "QKImage_createNew",
-    "QKImage_createWrap",
-    "QKImage_allocate",
-    "QKImage_deallocate",
-    "QKImage_reset",
-    "QKImage_destroy",
-    "QKImage_clone",
-    "QKImage_cloneHeader",
-    "QKImage_wrap",
+    "QKImage_requiredSize", "QKImage_size", "QKImage_createEmpty", "QKImage_createNew", "QKImage_createWrap",
+    "QKImage_allocate", "QKImage_deallocate", "QKImage_reset", "QKImage_destroy", "QKImage_clone",
+    "QKImage_cloneHeader", "QKImage_wrap",
     // Converters of the optional module.
-    "QKConverter_create",
-    "QKConverter_convert",
-    "QKConverter_release",
+    "QKConverter_create", "QKConverter_convert", "QKConverter_release",
     // Options.
-    "QKOption_RegisterNew",
-    "QKOption_FindByName",
-    "QKOption_FindIdByName",
-    "QKOption_FindById",
-    "QKOption_FindNameById",
-    "QKOption_CheckValueI",
-    "QKOption_CheckValueF",
-    "QKOption_CheckValueS",
-    "QKOption_ParseStringI",
-    "QKOption_ParseStringF",
-    "QKImage_convert",
-    "QKImage_copyAndConvert",
-    // Converters.
-    "_Z7csc_runPK7QKImagePS_",          // csc_run(const QKImage*, QKImage*)
-    "QKImage_rotate",
-    "QKImage_scale",
-    "QKImage_crop",
-    "QKImage_drawImage",
+    "QKOption_RegisterNew", "QKOption_FindByName", "QKOption_FindIdByName", "QKOption_FindById",
+    "QKOption_FindNameById", "QKOption_CheckValueI", "QKOption_CheckValueF", "QKOption_CheckValueS",
+    "QKOption_ParseStringI", "QKOption_ParseStringF",
+    // Conversion, csc_run(const QKImage*, QKImage*), geometry.
+    "QKImage_convert", "QKImage_copyAndConvert", "_Z7csc_runPK7QKImagePS_", "QKImage_rotate", "QKImage_scale",
+    "QKImage_crop", "QKImage_drawImage",
 };
 
 // Names of the defined, globally visible entries of an ELF64 file's dynamic

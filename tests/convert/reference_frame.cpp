@@ -2,7 +2,7 @@
 
 #include <stddef.h>
 
-#include "convert/formulas.h"
+#include <algorithm>
 
 namespace qktest {
 
@@ -13,26 +13,20 @@ const uint32_t kConvertibleFormats[13] = {
 
 namespace {
 
-char letter(uint32_t format, int i) { return static_cast<char>(format >> (8 * i)); }
-
-bool is_rgb(uint32_t format) {
-    for (int i = 0; i < 6; ++i) {
-        if (kConvertibleFormats[i] == format) return true;
-    }
-    return false;
-}
-
-// RGB family: the letters of the code are the byte order; a final '8' means
-// three bytes and no alpha.
+// RGB family (the first six formats): the letters of the code are the byte
+// order; a final '8' means three bytes and no alpha.
 struct RgbPlaces {
+    bool rgb = false;
     int bytes = 4;
     int r = -1, g = -1, b = -1, a = -1;
 };
 RgbPlaces rgb_places(uint32_t format) {
     RgbPlaces places;
-    if (letter(format, 3) == '8') places.bytes = 3;
+    places.rgb = std::find(kConvertibleFormats, kConvertibleFormats + 6, format) != kConvertibleFormats + 6;
+    if (!places.rgb) return places;
+    if (static_cast<char>(format >> 24) == '8') places.bytes = 3;
     for (int i = 0; i < places.bytes; ++i) {
-        switch (letter(format, i)) {
+        switch (static_cast<char>(format >> (8 * i))) {
             case 'R': places.r = i; break;
             case 'G': places.g = i; break;
             case 'B': places.b = i; break;
@@ -42,21 +36,16 @@ RgbPlaces rgb_places(uint32_t format) {
     return places;
 }
 
-struct Geometry {
-    size_t width, height, base;
-};
+bool packed(uint32_t format) { return format == QK_FORMAT_YUYV || format == QK_FORMAT_YVYU; }
 
-size_t luma_place(uint32_t format, const Geometry& g, size_t x, size_t y) {
-    const size_t pixel = y * g.width + x;
-    return (format == QK_FORMAT_YUYV || format == QK_FORMAT_YVYU) ? 2 * pixel : pixel;
-}
-
-// Places of the U and V bytes that cover pixel (x, y); false for GREY.
-bool chroma_places(uint32_t format, const Geometry& g, size_t x, size_t y, size_t* u, size_t* v) {
-    const size_t semiPlanar = g.base + (y / 2) * g.width + (x / 2) * 2;
-    const size_t planar = g.base + (y / 2) * (g.width / 2) + x / 2;
-    const size_t quarter = g.width * g.height / 4;
-    const size_t pair = (y * g.width + x / 2 * 2) * 2;
+// Places of the U and V bytes that cover pixel (x, y) of a width x height
+// image whose 4:2:0 chroma starts at `base`; false for GREY.
+bool chroma_places(uint32_t format, size_t width, size_t height, size_t base, size_t x, size_t y, size_t* u,
+                   size_t* v) {
+    const size_t semiPlanar = base + (y / 2) * width + (x / 2) * 2;
+    const size_t planar = base + (y / 2) * (width / 2) + x / 2;
+    const size_t quarter = width * height / 4;
+    const size_t pair = (y * width + x / 2 * 2) * 2;
     switch (format) {
         case QK_FORMAT_NV12: *u = semiPlanar, *v = semiPlanar + 1; return true;
         case QK_FORMAT_NV21: *v = semiPlanar, *u = semiPlanar + 1; return true;
@@ -68,56 +57,49 @@ bool chroma_places(uint32_t format, const Geometry& g, size_t x, size_t y, size_
     }
 }
 
-Geometry geometry(const QKImage& image, const QKImage& src) {
-    const size_t luma = static_cast<size_t>(src.width) * static_cast<size_t>(src.height);
-    return {static_cast<size_t>(src.width), static_cast<size_t>(src.height),
-            image.chromaOffset != 0 ? image.chromaOffset : luma};
-}
-
 }  // namespace
 
 std::vector<uint8_t> reference_conversion(const QKImage& src, const QKImage& dst, uint64_t capacity) {
     std::vector<uint8_t> out(dst.data, dst.data + capacity);
-    const Geometry in = geometry(src, src);
-    const Geometry to = geometry(dst, src);
-    const bool fromRgb = is_rgb(src.format);
-    const bool toRgb = is_rgb(dst.format);
-    const RgbPlaces inRgb = rgb_places(src.format);
-    const RgbPlaces outRgb = rgb_places(dst.format);
-    const bool toPacked = dst.format == QK_FORMAT_YUYV || dst.format == QK_FORMAT_YVYU;
+    const size_t width = static_cast<size_t>(src.width), height = static_cast<size_t>(src.height);
+    const size_t inBase = src.chromaOffset != 0 ? src.chromaOffset : width * height;
+    const size_t outBase = dst.chromaOffset != 0 ? dst.chromaOffset : width * height;
+    const RgbPlaces in = rgb_places(src.format), to = rgb_places(dst.format);
 
-    for (size_t y = 0; y < in.height; ++y) {
-        for (size_t x = 0; x < in.width; ++x) {
-            const uint8_t* s = fromRgb ? src.data + (y * in.width + x) * inRgb.bytes : nullptr;
+    for (size_t y = 0; y < height; ++y) {
+        for (size_t x = 0; x < width; ++x) {
+            const size_t pixel = y * width + x;
+            const uint8_t* s = in.rgb ? src.data + pixel * in.bytes : nullptr;
             int luma = 0, u = 127, v = 127;
-            if (!fromRgb) {
-                luma = src.data[luma_place(src.format, in, x, y)];
-                size_t up, vp;
-                if (chroma_places(src.format, in, x, y, &up, &vp)) u = src.data[up], v = src.data[vp];
+            size_t up, vp;
+            if (!in.rgb) {
+                luma = src.data[packed(src.format) ? 2 * pixel : pixel];
+                if (chroma_places(src.format, width, height, inBase, x, y, &up, &vp)) {
+                    u = src.data[up], v = src.data[vp];
+                }
             }
-            if (toRgb) {
-                uint8_t* d = out.data() + (y * in.width + x) * outRgb.bytes;
-                if (fromRgb) {
-                    d[outRgb.r] = s[inRgb.r], d[outRgb.g] = s[inRgb.g], d[outRgb.b] = s[inRgb.b];
-                    if (outRgb.a >= 0) d[outRgb.a] = inRgb.a >= 0 ? s[inRgb.a] : 255;
+            if (to.rgb) {
+                uint8_t* d = out.data() + pixel * to.bytes;
+                if (to.a >= 0) d[to.a] = in.a >= 0 ? s[in.a] : 255;
+                if (in.rgb) {
+                    d[to.r] = s[in.r], d[to.g] = s[in.g], d[to.b] = s[in.b];
                 } else {
                     // GREY has no chroma: its pixels are the formula at U = V = 128.
                     const bool grey = src.format == QK_FORMAT_GREY;
                     const Rgb rgb = formula_yuv_to_rgb(luma, grey ? 128 : u, grey ? 128 : v);
-                    d[outRgb.r] = static_cast<uint8_t>(rgb.r), d[outRgb.g] = static_cast<uint8_t>(rgb.g);
-                    d[outRgb.b] = static_cast<uint8_t>(rgb.b);
-                    if (outRgb.a >= 0) d[outRgb.a] = 255;
+                    d[to.r] = static_cast<uint8_t>(rgb.r), d[to.g] = static_cast<uint8_t>(rgb.g);
+                    d[to.b] = static_cast<uint8_t>(rgb.b);
                 }
                 continue;
             }
-            if (fromRgb) {
-                const Yuv yuv = formula_rgb_to_yuv(s[inRgb.r], s[inRgb.g], s[inRgb.b]);
+            if (in.rgb) {
+                const Yuv yuv = formula_rgb_to_yuv(s[in.r], s[in.g], s[in.b]);
                 luma = yuv.y, u = yuv.u, v = yuv.v;
             }
-            out[luma_place(dst.format, to, x, y)] = static_cast<uint8_t>(luma);
+            out[packed(dst.format) ? 2 * pixel : pixel] = static_cast<uint8_t>(luma);
             // Each chroma sample comes from the top-left pixel it covers.
-            size_t up, vp;
-            if (x % 2 == 0 && (toPacked || y % 2 == 0) && chroma_places(dst.format, to, x, y, &up, &vp)) {
+            if (x % 2 == 0 && (packed(dst.format) || y % 2 == 0) &&
+                chroma_places(dst.format, width, height, outBase, x, y, &up, &vp)) {
                 out[up] = static_cast<uint8_t>(u), out[vp] = static_cast<uint8_t>(v);
             }
         }

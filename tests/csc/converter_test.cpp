@@ -1,7 +1,6 @@
 // Converters against the stand-in module (found through LD_LIBRARY_PATH).
 // No case here makes the module unavailable, so their order does not matter.
 #include <gtest/gtest.h>
-#include <string.h>
 
 #include <memory>
 #include <string>
@@ -16,46 +15,43 @@ namespace {
 
 using qk::platform::Module;
 using qktest::LogCapture;
+using Strings = std::vector<std::string>;
 
 struct Release {
     void operator()(QKConverter* converter) const { QKConverter_release(converter); }
 };
 using ConverterPtr = std::unique_ptr<QKConverter, Release>;
 
+// The test's own reference to the stand-in keeps it, and its call counters,
+// loaded while the library opens and closes its own.
+struct StandIn {
+    Module module = Module::open("libqkcore_csc.so");
+    int counter(const char* name) const { return module.function<converter_stub::CounterFn>(name)(); }
+};
 constexpr const char* kNotFound = "libqkcore_csc.so not found: run through ctest, which sets LD_LIBRARY_PATH";
 
-// Reads one of the stand-in's call counters. The test's own reference to the
-// module keeps it, and its counters, loaded while the library closes its own.
-int counter(const Module& stand_in, const char* name) {
-    return stand_in.function<converter_stub::CounterFn>(name)();
-}
-
-// A small image whose buffer starts with the status the stand-in returns.
+// A small image: the stand-in returns the status at its start as a source,
+// and writes its converter's parameters there as a destination.
 struct Frame {
-    explicit Frame(int32_t status = 0) {
-        memcpy(bytes, &status, sizeof(status));
-        image.data = bytes;
+    explicit Frame(int32_t status = 0) : words{status} {
+        image.data = reinterpret_cast<uint8_t*>(words);
         image.isWrapped = 1;
     }
-    std::vector<int32_t> params() const {
-        std::vector<int32_t> values(4);
-        memcpy(values.data(), bytes, converter_stub::kParamsBytes);
-        return values;
-    }
-    uint8_t bytes[converter_stub::kParamsBytes] = {};
+    std::vector<int32_t> params() const { return {words, words + 4}; }
+    int32_t words[4] = {};
     QKImage image;
 };
 
 TEST(Converter, CreatesConvertsAndReleases) {
-    Module stand_in = Module::open("libqkcore_csc.so");
-    ASSERT_TRUE(stand_in) << kNotFound;
-    const int releases = counter(stand_in, "qk_csc_stub_releases");
+    StandIn stand_in;
+    ASSERT_TRUE(stand_in.module) << kNotFound;
+    const int releases = stand_in.counter("qk_csc_stub_releases");
 
     LogCapture log;
     ConverterPtr small(QKConverter_create(64, 48, QK_FORMAT_NV21, QK_FORMAT_NV12));
     ASSERT_TRUE(small);
-    EXPECT_EQ(log.texts(1), (std::vector<std::string>{"QKConverter_create: 64x48 NV21 --> NV12",
-                                                      "QKConverter: Calling qk_csc_init: 64x48 NV21 --> NV12"}));
+    EXPECT_EQ(log.texts(1), (Strings{"QKConverter_create: 64x48 NV21 --> NV12",
+                                     "QKConverter: Calling qk_csc_init: 64x48 NV21 --> NV12"}));
     EXPECT_EQ(log.lines().size(), 2u);
 
     // Each handle forwards its own context and the images in their places; the
@@ -69,11 +65,10 @@ TEST(Converter, CreatesConvertsAndReleases) {
         EXPECT_EQ(QKConverter_convert(large.get(), &src.image, &dst.image), status);
         EXPECT_EQ(dst.params(), (std::vector<int32_t>{4000, 3000, int32_t(QK_FORMAT_BGRA), int32_t(QK_FORMAT_D16)}));
     }
-
     small.reset();
     large.reset();
     QKConverter_release(nullptr);
-    EXPECT_EQ(counter(stand_in, "qk_csc_stub_releases"), releases + 2);
+    EXPECT_EQ(stand_in.counter("qk_csc_stub_releases"), releases + 2);
     EXPECT_TRUE(qktest::HasNoErrors(log));
 }
 
@@ -82,9 +77,9 @@ TEST(Converter, RefusedPairFailsOnlyThatConverter) {
     {
         LogCapture log;
         EXPECT_EQ(QKConverter_create(8, 8, converter_stub::kRefusedSrc, converter_stub::kRefusedDst), nullptr);
-        EXPECT_EQ(log.texts(1), (std::vector<std::string>{"QKConverter_create: 8x8 NV21 --> RGBA",
-                                                          "QKConverter: Calling qk_csc_init: 8x8 NV21 --> RGBA"}));
-        EXPECT_EQ(log.texts(4), std::vector<std::string>{"QKConverter: Could not create this converter."});
+        EXPECT_EQ(log.texts(1), (Strings{"QKConverter_create: 8x8 NV21 --> RGBA",
+                                         "QKConverter: Calling qk_csc_init: 8x8 NV21 --> RGBA"}));
+        EXPECT_EQ(log.texts(4), Strings{"QKConverter: Could not create this converter."});
     }
     EXPECT_FALSE(converter_stub::module_loaded()) << "the module stayed open after a refused converter";
 
@@ -96,29 +91,22 @@ TEST(Converter, RefusedPairFailsOnlyThatConverter) {
 }
 
 TEST(Converter, ConvertRefusesNullsWithoutCallingTheModule) {
-    Module stand_in = Module::open("libqkcore_csc.so");
-    ASSERT_TRUE(stand_in) << kNotFound;
+    StandIn stand_in;
+    ASSERT_TRUE(stand_in.module) << kNotFound;
     ConverterPtr converter(QKConverter_create(4, 2, QK_FORMAT_RGBA, QK_FORMAT_RGBA));
     ASSERT_TRUE(converter);
-    const int converts = counter(stand_in, "qk_csc_stub_converts");
-
+    const int converts = stand_in.counter("qk_csc_stub_converts");
     Frame src(7), dst;
-    QKImage no_buffer;
-    struct Case {
-        QKConverter* converter;
-        const QKImage* src;
-        QKImage* dst;
-    } cases[] = {
-        {nullptr, &src.image, &dst.image},          {converter.get(), nullptr, &dst.image},
-        {converter.get(), &src.image, nullptr},     {converter.get(), &no_buffer, &dst.image},
-        {converter.get(), &src.image, &no_buffer},
-    };
-    for (const Case& c : cases) {
+    QKImage none;  // no buffer
+    QKConverter* c = converter.get();
+    for (auto [conv, from, to] : {std::tuple<QKConverter*, const QKImage*, QKImage*>{nullptr, &src.image, &dst.image},
+                                  {c, nullptr, &dst.image}, {c, &src.image, nullptr}, {c, &none, &dst.image},
+                                  {c, &src.image, &none}}) {
         LogCapture log;
-        EXPECT_EQ(QKConverter_convert(c.converter, c.src, c.dst), QK_ERROR_NULL_PARAM);
+        EXPECT_EQ(QKConverter_convert(conv, from, to), QK_ERROR_NULL_PARAM);
         EXPECT_TRUE(qktest::HasOneFailureReport(log, QK_ERROR_NULL_PARAM, "src/csc/converter.cpp"));
     }
-    EXPECT_EQ(counter(stand_in, "qk_csc_stub_converts"), converts);
+    EXPECT_EQ(stand_in.counter("qk_csc_stub_converts"), converts);
     EXPECT_EQ(dst.params(), std::vector<int32_t>(4, 0));
 }
 

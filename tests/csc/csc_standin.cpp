@@ -8,35 +8,29 @@
 
 #include "csc/csc_standin.h"
 
-#define QK_STANDIN_EXPORT extern "C" __attribute__((visibility("default")))
-
 extern "C" {
-__attribute__((visibility("default"))) CscStandinCall csc_standin_last_call = {};
-}
 
-namespace {
+__attribute__((visibility("default"))) CscStandinCall csc_standin_last_call = {};
 
 // Unused in the stand-in that offers no entry point.
-[[maybe_unused]] int record(const char* entry, uint8_t* luma, uint8_t* chroma, const uint8_t* bgra, int32_t width, int32_t height) {
+[[maybe_unused]] static int record(const char* entry, uint8_t* luma, uint8_t* chroma, const uint8_t* bgra,
+                                   int32_t width, int32_t height) {
     csc_standin_last_call = {csc_standin_last_call.calls + 1, entry, luma, chroma, bgra, width, height};
-    const size_t pixels = static_cast<size_t>(width) * static_cast<size_t>(height);
-    memset(luma, kCscStandinLuma, pixels);
-    memset(chroma, kCscStandinChroma, pixels / 2);
+    memset(luma, kCscStandinLuma, static_cast<size_t>(width) * height);
+    memset(chroma, kCscStandinChroma, static_cast<size_t>(width) * height / 2);
     return 0;
 }
 
-}  // namespace
-
+#define QK_STANDIN_ENTRY(name)                                                                                \
+    __attribute__((visibility("default"))) int name(uint8_t* luma, uint8_t* chroma, const uint8_t* bgra,   \
+                                                    int32_t width, int32_t height) {                        \
+        return record(#name, luma, chroma, bgra, width, height);                                             \
+    }
 #ifdef QK_STANDIN_NEON
-QK_STANDIN_EXPORT int csc_ARGB8888_to_YUV420SP_NEON(uint8_t* luma, uint8_t* chroma, const uint8_t* bgra,
-                                                    int32_t width, int32_t height) {
-    return record("csc_ARGB8888_to_YUV420SP_NEON", luma, chroma, bgra, width, height);
-}
+QK_STANDIN_ENTRY(csc_ARGB8888_to_YUV420SP_NEON)
+#endif
+#ifdef QK_STANDIN_PLAIN
+QK_STANDIN_ENTRY(csc_ARGB8888_to_YUV420SP)
 #endif
 
-#ifdef QK_STANDIN_PLAIN
-QK_STANDIN_EXPORT int csc_ARGB8888_to_YUV420SP(uint8_t* luma, uint8_t* chroma, const uint8_t* bgra, int32_t width,
-                                               int32_t height) {
-    return record("csc_ARGB8888_to_YUV420SP", luma, chroma, bgra, width, height);
-}
-#endif
+}  // extern "C"

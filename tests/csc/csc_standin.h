@@ -11,13 +11,11 @@ struct CscStandinCall {
     uint8_t* luma;
     uint8_t* chroma;
     const uint8_t* bgra;
-    int32_t width;
-    int32_t height;
+    int32_t width, height;
 };
 
 constexpr const char* kCscStandinRecord = "csc_standin_last_call";
 // The stand-in's fill bytes for luma and chroma.
-constexpr uint8_t kCscStandinLuma = 0xA5;
-constexpr uint8_t kCscStandinChroma = 0x5A;
+constexpr uint8_t kCscStandinLuma = 0xA5, kCscStandinChroma = 0x5A;
 
 #endif  // QKCORE_TESTS_CSC_CSC_STANDIN_H

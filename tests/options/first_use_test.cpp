@@ -15,46 +15,38 @@
 
 namespace {
 
-constexpr int kThreads = 8;
-constexpr int kKeysPerThread = 2000;
-
 TEST(OptionRegisterFirstUse, RacingThreadsShareOneRegisterAndDrawDistinctKeys) {
+    constexpr int kThreads = 8, kKeysPerThread = 2000;
     static std::string names[kThreads];
     static QKOption_t options[kThreads];
+    qktest::LogCapture log;   // installed before the threads start
+    std::mutex registration;  // clients serialise registrations; first use needs no lock
+    std::atomic<int> starting{kThreads}, looking_up{kThreads};
+    const qk::options::Register* seen[kThreads] = {};
+    std::set<int32_t> keys[kThreads];
+    std::vector<std::thread> threads;
     for (int t = 0; t < kThreads; ++t) {
         names[t] = "option" + std::to_string(t);
         options[t] = {0, names[t].c_str(), QK_OPTION_INTEGER, 0, 0, nullptr};
-    }
-    qktest::LogCapture log;  // installed before the threads start
-    std::mutex registration;  // clients serialise registrations; first use needs no lock
-    std::atomic<int> starting{kThreads};
-    std::atomic<int> lookups_running{kThreads};
-    const qk::options::Register* seen[kThreads] = {};
-    std::vector<int32_t> keys[kThreads];
-
-    std::vector<std::thread> threads;
-    for (int t = 0; t < kThreads; ++t) {
         threads.emplace_back([&, t] {
-            starting.fetch_sub(1);
-            while (starting.load() > 0) std::this_thread::yield();
+            for (starting.fetch_sub(1); starting.load() > 0;) std::this_thread::yield();
             QKOption_FindById(t + 1);  // a lookup is a first use too
             seen[t] = &qk::options::option_register();
-            for (int k = 0; k < kKeysPerThread; ++k) keys[t].push_back(qk::options::draw_key());
+            for (int k = 0; k < kKeysPerThread; ++k) keys[t].insert(qk::options::draw_key());
             // Lookups must not overlap registrations.
-            lookups_running.fetch_sub(1);
-            while (lookups_running.load() > 0) std::this_thread::yield();
+            for (looking_up.fetch_sub(1); looking_up.load() > 0;) std::this_thread::yield();
             std::lock_guard<std::mutex> lock(registration);
             QKOption_RegisterNew(&options[t]);
         });
     }
     for (std::thread& thread : threads) thread.join();
 
-    for (int t = 1; t < kThreads; ++t) EXPECT_EQ(seen[t], seen[0]);
     std::set<int32_t> all;
     for (int t = 0; t < kThreads; ++t) {
+        EXPECT_EQ(seen[t], seen[0]);
+        EXPECT_EQ(QKOption_FindByName(names[t].c_str()), &options[t]);
         all.insert(keys[t].begin(), keys[t].end());
         all.insert(options[t].key);
-        EXPECT_EQ(QKOption_FindByName(names[t].c_str()), &options[t]);
     }
     // Every key handed out once, none skipped, starting one above the counter.
     const int drawn = kThreads * (kKeysPerThread + 1);

@@ -11,13 +11,7 @@
 
 namespace {
 
-using Lines = std::vector<std::pair<int, std::string>>;
-
-Lines lines_of(const qktest::LogCapture& log) {
-    Lines lines;
-    for (const qktest::LogLine& line : log.lines()) lines.emplace_back(line.level, line.text);
-    return lines;
-}
+using Lines = std::vector<qktest::LogLine>;
 
 const QKOptionEnum_t kFlash[] = {{0, "auto"}, {1, "on"}, {7, "off"}, {QK_OPTION_ENUM_END, nullptr}};
 const QKOptionEnum_t kNoValues[] = {{QK_OPTION_ENUM_END, "unused"}};
@@ -34,14 +28,14 @@ TEST(FreshOptionRegister, FirstKeysAndDumpLines) {
     qktest::LogCapture log;
     ASSERT_EQ(QKOption_RegisterNew(&iso), 1);
     EXPECT_EQ(iso.key, 0x13370001);
-    EXPECT_EQ(lines_of(log), (Lines{{1, "DEBUG: Registering option 'iso' as key 0x13370001"},
+    EXPECT_EQ(log.lines(), (Lines{{1, "DEBUG: Registering option 'iso' as key 0x13370001"},
                                     {1, "OptionsRegister[00]: 'iso' 0x13370001 INTEGER 100 - 3200"}}));
 
     // A fixed negative key sorts before every counter key.
     log.clear();
     ASSERT_EQ(QKOption_RegisterNew(&ev), 1);
     EXPECT_EQ(ev.key, -5);
-    EXPECT_EQ(lines_of(log), (Lines{{1, "OptionsRegister[00]: 'ev' 0xfffffffb FLOAT -2.000000 - 2.500000"},
+    EXPECT_EQ(log.lines(), (Lines{{1, "OptionsRegister[00]: 'ev' 0xfffffffb FLOAT -2.000000 - 2.500000"},
                                     {1, "OptionsRegister[01]: 'iso' 0x13370001 INTEGER 100 - 3200"}}));
 
     for (QKOption_t* option : {&flash, &tag, &scene, &effect, &odd}) ASSERT_EQ(QKOption_RegisterNew(option), 1);
@@ -52,7 +46,7 @@ TEST(FreshOptionRegister, FirstKeysAndDumpLines) {
     log.clear();
     static QKOption_t last = {0, "last", QK_OPTION_STRING, 0, 0, nullptr};
     ASSERT_EQ(QKOption_RegisterNew(&last), 1);
-    EXPECT_EQ(lines_of(log), (Lines{
+    EXPECT_EQ(log.lines(), (Lines{
                                  {1, "DEBUG: Registering option 'last' as key 0x13370006"},
                                  {1, "OptionsRegister[00]: 'ev' 0xfffffffb FLOAT -2.000000 - 2.500000"},
                                  {1, "OptionsRegister[01]: 'iso' 0x13370001 INTEGER 100 - 3200"},

@@ -10,14 +10,6 @@ namespace {
 
 using qk::platform::Bitmap;
 
-uint32_t pixel(const Bitmap& bitmap, int32_t x, int32_t y) {
-    uint32_t value;
-    memcpy(&value, bitmap.row(y) + x * 4, 4);
-    return value;
-}
-
-void set(Bitmap& bitmap, int32_t x, int32_t y, uint32_t value) { memcpy(bitmap.row(y) + x * 4, &value, 4); }
-
 uint32_t rgba(int r, int g, int b, int a) {
     const uint8_t bytes[4] = {uint8_t(r), uint8_t(g), uint8_t(b), uint8_t(a)};
     uint32_t value;
@@ -25,18 +17,26 @@ uint32_t rgba(int r, int g, int b, int a) {
     return value;
 }
 
+// A bitmap over a copy of `pixels`, a row of `width`.
+struct Pixels {
+    Pixels(std::vector<uint32_t> initial, int32_t width) : values(std::move(initial)) {
+        EXPECT_TRUE(bitmap.borrow(reinterpret_cast<uint8_t*>(values.data()), width, values.size() / width));
+    }
+    std::vector<uint32_t> values;
+    Bitmap bitmap;
+};
+
 TEST(Bitmap, OwnedPixelsAndTheirLimits) {
     // Small bitmaps come from the heap, frame-sized ones are mapped: both
     // start transparent black when asked to.
     for (auto [w, h] : {std::pair<int32_t, int32_t>{5, 3}, {1024, 1025}}) {
         Bitmap owned;
         ASSERT_TRUE(owned.allocate(w, h, /*cleared=*/true));
-        EXPECT_EQ(owned.row_bytes(), size_t(w) * 4);
-        const std::vector<uint8_t> zero(owned.byte_count(), 0);
-        EXPECT_EQ(0, memcmp(owned.pixels(), zero.data(), zero.size()));
-        std::vector<uint8_t> out(owned.byte_count());
+        std::vector<uint8_t> out(owned.byte_count(), 1);
         EXPECT_FALSE(owned.copy_to(out.data(), out.size() - 1));  // too small: nothing copied
+        EXPECT_EQ(std::count(out.begin(), out.end(), 1), long(out.size()));
         EXPECT_TRUE(owned.copy_to(out.data(), out.size()));
+        EXPECT_EQ(std::count(out.begin(), out.end(), 0), long(out.size()));
     }
     Bitmap refused;
     EXPECT_FALSE(refused.allocate(3, -1, false));
@@ -45,7 +45,8 @@ TEST(Bitmap, OwnedPixelsAndTheirLimits) {
     EXPECT_FALSE(refused.has_pixels());
 }
 
-// Premultiplied source-over: result = src + dst x (255 - src alpha) / 255.
+// Premultiplied source-over: result = src + dst x (255 - src alpha) / 255,
+// turned or scaled alike.
 TEST(Raster, DrawingBlendsSourceOver) {
     const struct {
         uint32_t src, dst, expected;
@@ -58,22 +59,17 @@ TEST(Raster, DrawingBlendsSourceOver) {
         {rgba(250, 0, 0, 10), rgba(200, 0, 0, 200), rgba(255, 0, 0, 202)},            // saturates
     };
     for (const auto& c : cases) {
-        Bitmap source, target;
-        ASSERT_TRUE(source.allocate(1, 1, false));
-        ASSERT_TRUE(target.allocate(1, 1, false));
-        set(source, 0, 0, c.src);
-        set(target, 0, 0, c.dst);
-        qk::platform::draw_turned(source, 0, 0, 0, target);
-        EXPECT_EQ(pixel(target, 0, 0), c.expected) << std::hex << c.src << " over " << c.dst;
-        set(target, 0, 0, c.dst);
-        qk::platform::draw_scaled(source, 1.0f, 1.0f, target);
-        EXPECT_EQ(pixel(target, 0, 0), c.expected) << std::hex << c.src << " over " << c.dst << " (scaled)";
+        Pixels source({c.src}, 1), turned({c.dst}, 1), scaled({c.dst}, 1);
+        qk::platform::draw_turned(source.bitmap, 0, 0, 0, turned.bitmap);
+        qk::platform::draw_scaled(source.bitmap, 1.0f, 1.0f, scaled.bitmap);
+        EXPECT_EQ(turned.values[0], c.expected) << std::hex << c.src << " over " << c.dst;
+        EXPECT_EQ(scaled.values[0], c.expected) << std::hex << c.src << " over " << c.dst << " (scaled)";
     }
 }
 
 // Forward reference: the centre of source pixel (i, j) turned clockwise about
-// the pivot lands on the centre of the target pixel that shows it. Half turns
-// are also checked in place.
+// the pivot lands on the centre of the target pixel that shows it. Shapes and
+// pivots that rotation never uses; half turns also in place.
 TEST(Raster, TurnsAboutAnIntegerPivot) {
     const struct {
         int32_t w, h, tw, th, px, py;
@@ -81,12 +77,11 @@ TEST(Raster, TurnsAboutAnIntegerPivot) {
                   {4, 3, 4, 3, 2, 1}, {8, 8, 8, 8, 4, 4}, {13, 9, 11, 14, 6, 5}, {6, 4, 6, 4, 5, 0}};
     for (const auto& s : shapes) {
         // Opaque in the top half, translucent below: blocks of either kind and mixed ones.
-        auto value = [&](int32_t i, int32_t j) { return rgba(i, j, 7, j < s.h / 2 ? 255 : 20 + i * 10 + j); };
-        Bitmap source;
-        ASSERT_TRUE(source.allocate(s.w, s.h, false));
+        std::vector<uint32_t> values;
         for (int32_t j = 0; j < s.h; ++j) {
-            for (int32_t i = 0; i < s.w; ++i) set(source, i, j, value(i, j));
+            for (int32_t i = 0; i < s.w; ++i) values.push_back(rgba(i, j, 7, j < s.h / 2 ? 255 : 20 + i * 10 + j));
         }
+        Pixels source(values, s.w);
         for (int turns : {0, 1, 2, 3, -1, 6}) {
             SCOPED_TRACE(::testing::Message() << s.w << "x" << s.h << " pivot " << s.px << "," << s.py << " turns "
                                               << turns);
@@ -97,17 +92,16 @@ TEST(Raster, TurnsAboutAnIntegerPivot) {
                     int64_t x = 2 * i + 1 - 2 * s.px, y = 2 * j + 1 - 2 * s.py;
                     for (int k = 0; k < ((turns % 4) + 4) % 4; ++k) std::swap(x, y), x = -x;  // (x, y) -> (-y, x)
                     const int64_t tx = (x + 2 * s.px - 1) / 2, ty = (y + 2 * s.py - 1) / 2;
-                    if (tx >= 0 && tx < s.tw && ty >= 0 && ty < s.th) expected[ty * s.tw + tx] = value(i, j);
+                    if (tx >= 0 && tx < s.tw && ty >= 0 && ty < s.th) expected[ty * s.tw + tx] = values[j * s.w + i];
                 }
             }
-            Bitmap target;
-            ASSERT_TRUE(target.allocate(s.tw, s.th, /*cleared=*/true));
-            qk::platform::draw_turned(source, turns, s.px, s.py, target);
-            EXPECT_EQ(0, memcmp(target.pixels(), expected.data(), target.byte_count()));
+            Pixels target(std::vector<uint32_t>(expected.size(), 0), s.tw);
+            qk::platform::draw_turned(source.bitmap, turns, s.px, s.py, target.bitmap);
+            EXPECT_EQ(target.values, expected);
             if (turns == 2 && s.tw == s.w && s.th == s.h) {
-                ASSERT_TRUE(source.copy_to(target.pixels(), target.byte_count()));
-                qk::platform::turn_half_in_place(target, s.px, s.py);
-                EXPECT_EQ(0, memcmp(target.pixels(), expected.data(), target.byte_count())) << "in place";
+                Pixels in_place(values, s.w);
+                qk::platform::turn_half_in_place(in_place.bitmap, s.px, s.py);
+                EXPECT_EQ(in_place.values, expected) << "in place";
             }
         }
     }

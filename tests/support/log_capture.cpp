@@ -3,6 +3,8 @@
 #include <stdarg.h>
 #include <stdio.h>
 
+#include <algorithm>
+#include <map>
 
 namespace qktest {
 
@@ -38,73 +40,41 @@ std::vector<std::string> LogCapture::texts(int level) const {
 }
 
 bool LogCapture::contains(int level, const std::string& text) const {
-    for (const LogLine& line : lines_) {
-        if (line.level == level && line.text == text) return true;
-    }
-    return false;
+    const std::vector<std::string> all = texts(level);
+    return std::find(all.begin(), all.end(), text) != all.end();
 }
 
 namespace {
 
-const char* name_of(int32_t status) {
-    switch (status) {
-        case -1: return "QK_ERROR_UNKNOWN";
-        case -2: return "QK_ERROR_NULL_PARAM";
-        case -3: return "QK_ERROR_INVALID_PARAM";
-        case -4: return "QK_ERROR_INVALID_SIZE";
-        case -5: return "QK_ERROR_ALLOC_FAILED";
-        case -6: return "QK_ERROR_UNSUPPORTED";
-        case -8: return "QK_ERROR_IO_FAILED";
-        case -9: return "QK_ERROR_CODEC_FAILED";
-        case -42: return "QK_ERROR_NOT_IMPLEMENTED";
-        default: return "?";
-    }
-}
-
-std::string dump(const LogCapture& log) {
-    std::string all;
-    for (const LogLine& line : log.lines()) all += "\n  [" + std::to_string(line.level) + "] " + line.text;
-    return all.empty() ? " (nothing logged)" : all;
+// Whether `text` continues after `at` with one or more decimal digits only.
+bool digits_from(const std::string& text, size_t at) {
+    return at < text.size() && text.find_first_not_of("0123456789", at) == std::string::npos;
 }
 
 }  // namespace
 
-// A failure report reads "NAME (VALUE): FILE:LINE". Returns false for any
-// other text; otherwise sets the status name, value text and file.
-bool parse_report(const std::string& text, std::string* name, std::string* value, std::string* file) {
-    size_t open = text.find(" (");
-    size_t close = text.find("): ", open);
-    size_t colon = text.rfind(':');
-    if (text.compare(0, 3, "QK_") != 0 || open == std::string::npos || close == std::string::npos ||
-        colon <= close + 2 || colon + 1 == text.size()) {
-        return false;
-    }
-    for (size_t i = colon + 1; i < text.size(); ++i) {
-        if (text[i] < '0' || text[i] > '9') return false;
-    }
-    *name = text.substr(0, open);
-    *value = text.substr(open + 2, close - open - 2);
-    *file = text.substr(close + 3, colon - close - 3);
-    return true;
-}
-
+// A failure report is a level-4 line "NAME (VALUE): FILE:LINE".
 ::testing::AssertionResult HasOneFailureReport(const LogCapture& log, int32_t status, const char* file) {
-    int reports = 0;
-    int matching = 0;
+    static const std::map<int32_t, std::string> names = {{-2, "NULL_PARAM"},   {-3, "INVALID_PARAM"},
+                                                         {-4, "INVALID_SIZE"}, {-5, "ALLOC_FAILED"},
+                                                         {-6, "UNSUPPORTED"},  {-42, "NOT_IMPLEMENTED"}};
+    const std::string wanted = "QK_ERROR_" + names.at(status) + " (" + std::to_string(status) + "): " + file + ":";
+    int reports = 0, matching = 0;
     for (const std::string& text : log.texts(4)) {
-        std::string name, value, place;
-        if (!parse_report(text, &name, &value, &place)) continue;
+        const size_t close = text.find("): "), colon = text.rfind(':');
+        const bool report = text.rfind("QK_", 0) == 0 && close != std::string::npos && colon > close + 2;
+        if (!report || !digits_from(text, colon + 1)) continue;
         ++reports;
-        if (name == name_of(status) && value == std::to_string(status) && place == file) ++matching;
+        matching += text.compare(0, wanted.size(), wanted) == 0 && digits_from(text, wanted.size());
     }
     if (reports == 1 && matching == 1) return ::testing::AssertionSuccess();
-    return ::testing::AssertionFailure() << "expected one failure report of " << name_of(status) << " at " << file
-                                         << ", log was:" << dump(log);
+    return ::testing::AssertionFailure() << "expected one failure report \"" << wanted
+                                         << "LINE\", log was: " << ::testing::PrintToString(log.lines());
 }
 
 ::testing::AssertionResult HasNoErrors(const LogCapture& log) {
     if (log.texts(4).empty()) return ::testing::AssertionSuccess();
-    return ::testing::AssertionFailure() << "unexpected errors:" << dump(log);
+    return ::testing::AssertionFailure() << "unexpected errors: " << ::testing::PrintToString(log.lines());
 }
 
 }  // namespace qktest

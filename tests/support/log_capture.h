@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <stdint.h>
 
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -15,7 +16,9 @@ namespace qktest {
 struct LogLine {
     int level;
     std::string text;
+    bool operator==(const LogLine& other) const { return level == other.level && text == other.text; }
 };
+inline void PrintTo(const LogLine& line, std::ostream* out) { *out << "[" << line.level << "] " << line.text; }
 
 class LogCapture {
 public:

@@ -1,64 +1,53 @@
 #include <gtest/gtest.h>
 
+#include <string>
+#include <vector>
+
 #include "platform/clock.h"
 #include "qkcore/qk_log.h"
 #include "support/log_capture.h"
 
 namespace {
 
-// Timing probes driven by a clock the test sets.
+using Lines = std::vector<std::string>;
+
+// Timing probes driven by a clock the test sets, starting at an arbitrary
+// time that is not a multiple of 1000.
+int64_t now_ns;
+void advance_us(int64_t micros) { now_ns += micros * 1000; }
+
 class TimeStatTest : public ::testing::Test {
 protected:
-    static int64_t fake_clock() { return now_ns; }
     void SetUp() override {
-        now_ns = 1'000'000'000'123;  // an arbitrary start, not a multiple of 1000
-        qk::platform::set_clock_for_testing(fake_clock);
+        now_ns = 1'000'000'000'123;
+        qk::platform::set_clock_for_testing([] { return now_ns; });
     }
     void TearDown() override { qk::platform::set_clock_for_testing(nullptr); }
-    static void advance_us(int64_t micros) { now_ns += micros * 1000; }
-
-    static int64_t now_ns;
     qktest::LogCapture log;
 };
-int64_t TimeStatTest::now_ns = 0;
 
 TEST_F(TimeStatTest, ExitMessageSwitchesToWholeMillisecondsAbove5ms) {
-    const struct {
-        int64_t elapsed_us;
-        const char* exit;
-    } cases[] = {{750, "Exit (0.750ms)"}, {5000, "Exit (5.000ms)"}, {5001, "Exit (5ms)"}, {12999, "Exit (12ms)"}};
-    for (const auto& c : cases) {
+    for (auto [elapsed_us, exit] : {std::pair<int64_t, const char*>{750, "Exit (0.750ms)"}, {5000, "Exit (5.000ms)"},
+                                    {5001, "Exit (5ms)"}, {12999, "Exit (12ms)"}}) {
         log.clear();
         {
             TimeStat probe("cam", "encode", 77, false);
-            advance_us(c.elapsed_us);
+            advance_us(elapsed_us);
         }
-        ASSERT_EQ(log.lines().size(), 1u);
-        EXPECT_EQ(log.lines()[0].level, 1);
-        EXPECT_EQ(log.lines()[0].text, std::string("[cam] encode(77): ") + c.exit);
+        EXPECT_EQ(log.lines(), (std::vector<qktest::LogLine>{{1, std::string("[cam] encode(77): ") + exit}}));
     }
 }
 
-TEST_F(TimeStatTest, EntryMessagesOnlyWhenEnabled) {
+TEST_F(TimeStatTest, EntryMessagesOnlyWhenEnabledAndNoExitWithoutName) {
     {
-        TimeStat probe("cam", "decode", 12, true);
-        TimeStat plain("scale", true);
-        ASSERT_EQ(log.lines().size(), 2u);
-        EXPECT_EQ(log.lines()[0].text, "[cam] decode:12: Entry");
-        EXPECT_EQ(log.lines()[1].text, "[velcamera] scale: Entry");
-        EXPECT_EQ(plain.tag, nullptr);
-        EXPECT_EQ(plain.line, -1);
+        TimeStat probe("cam", "decode", 12, true), plain("scale", true);
+        TimeStat quiet("quiet", false), nameless(nullptr, false);
+        EXPECT_EQ(log.texts(1), (Lines{"[cam] decode:12: Entry", "[velcamera] scale: Entry"}));
         log.clear();
     }
-    // Exit messages in destruction order; the tagless probe shows the log tag.
-    ASSERT_EQ(log.lines().size(), 2u);
-    EXPECT_EQ(log.lines()[0].text, "[velcamera] scale(-1): Exit (0.000ms)");
-    EXPECT_EQ(log.lines()[1].text, "[cam] decode(12): Exit (0.000ms)");
-}
-
-TEST_F(TimeStatTest, NullNameSilencesTheExit) {
-    { TimeStat probe(nullptr, false); }
-    EXPECT_TRUE(log.lines().empty());
+    // Exit messages in destruction order; the tagless probes show the log tag.
+    EXPECT_EQ(log.texts(1), (Lines{"[velcamera] quiet(-1): Exit (0.000ms)", "[velcamera] scale(-1): Exit (0.000ms)",
+                                   "[cam] decode(12): Exit (0.000ms)"}));
 }
 
 TEST_F(TimeStatTest, StampsAndReadingsCountFromConstruction) {
@@ -71,17 +60,14 @@ TEST_F(TimeStatTest, StampsAndReadingsCountFromConstruction) {
     advance_us(4000);
     probe.TimeStamp("after jpeg");
     EXPECT_EQ(probe(), 7000);
-    ASSERT_EQ(log.lines().size(), 2u);
-    EXPECT_EQ(log.lines()[0].text, "[frame] after isp: 3ms");
-    EXPECT_EQ(log.lines()[1].text, "[frame] after jpeg: 7ms");
+    EXPECT_EQ(log.texts(1), (Lines{"[frame] after isp: 3ms", "[frame] after jpeg: 7ms"}));
 }
 
 // The real clock: boot time in nanoseconds, never going back.
 TEST(BootClock, IsMonotonic) {
-    int64_t first = qk::platform::elapsed_realtime_nano();
-    int64_t second = qk::platform::elapsed_realtime_nano();
+    const int64_t first = qk::platform::elapsed_realtime_nano();
     EXPECT_GT(first, 0);
-    EXPECT_GE(second, first);
+    EXPECT_GE(qk::platform::elapsed_realtime_nano(), first);
 }
 
 }  // namespace

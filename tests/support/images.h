@@ -1,7 +1,7 @@
 // Small images whose bytes all differ, and snapshots that show whether an
 // operation left an image alone.
-#ifndef QKCORE_TESTS_GEOMETRY_IMAGES_H
-#define QKCORE_TESTS_GEOMETRY_IMAGES_H
+#ifndef QKCORE_TESTS_SUPPORT_IMAGES_H
+#define QKCORE_TESTS_SUPPORT_IMAGES_H
 
 #include <stdint.h>
 #include <string.h>
@@ -48,34 +48,44 @@ inline uint32_t pixel_at(const QKImage& image, int32_t x, int32_t y) {
     return value;
 }
 
-inline void set_pixel(QKImage& image, int32_t x, int32_t y, uint32_t value) {
-    memcpy(image.data + (static_cast<size_t>(y) * image.width + x) * 4, &value, 4);
-}
-
 // An RGBA image whose pixel (x, y) is rgba_pixel(y * width + x).
 inline ImagePtr numbered_rgba(int32_t width, int32_t height) {
     ImagePtr image(QKImage_createNew(width, height, QK_FORMAT_RGBA));
-    for (int32_t i = 0; i < width * height; ++i) set_pixel(*image, i % width, i / width, rgba_pixel(i));
+    for (int32_t i = 0; i < width * height; ++i) {
+        const uint32_t pixel = rgba_pixel(i);
+        memcpy(image->data + 4 * i, &pixel, 4);
+    }
     return image;
 }
 
-// Every field of an image and the bytes of its buffer.
-inline auto snapshot(const QKImage& image) {
+// Every field of an image and the bytes of its buffer; the same for every
+// null image.
+inline auto snapshot(const QKImage* image) {
+    static const QKImage none;
+    const QKImage& i = image != nullptr ? *image : none;
     std::vector<uint8_t> bytes;
-    if (image.data != nullptr) bytes.assign(image.data, image.data + QKImage_size(&image));
-    return std::make_tuple(image.data, image.width, image.height, image.format, image.isWrapped, image.size,
-                           image.chromaOffset, bytes);
+    if (i.data != nullptr) bytes.assign(i.data, i.data + QKImage_size(&i));
+    return std::make_tuple(i.data, i.width, i.height, i.format, i.isWrapped, i.size, i.chromaOffset, bytes);
 }
 
-// The Y, U and V samples of pixel (x, y) of a 4:2:0 image, each addressed on
-// its own from the format's layout and the image's chroma base.
-inline std::tuple<uint8_t, uint8_t, uint8_t> yuv_at(const QKImage& image, int32_t x, int32_t y) {
+inline bool is_yuv420(uint32_t f) {
+    return f == QK_FORMAT_NV12 || f == QK_FORMAT_NV21 || f == QK_FORMAT_YV12 || f == QK_FORMAT_YUVP;
+}
+
+// What pixel (x, y) of a packed RGB or 4:2:0 image holds: its own bytes, or
+// its Y, U and V samples, each addressed on its own from the format's layout
+// and the image's chroma base.
+inline std::vector<uint8_t> pixel_bytes(const QKImage& image, int32_t x, int32_t y) {
     const size_t w = static_cast<size_t>(image.width);
+    if (!is_yuv420(image.format)) {
+        const size_t bpp = QKImage_requiredSize(1, 1, image.format);
+        return std::vector<uint8_t>(image.data + (y * w + x) * bpp, image.data + (y * w + x + 1) * bpp);
+    }
     const size_t base = image.chromaOffset != 0 ? image.chromaOffset : w * image.height;
     const size_t quarter = w * image.height / 4;
     const uint8_t* d = image.data + base;
-    const size_t pair = (y / 2) * w + (x / 2) * 2;    // NV12, NV21: U,V pairs in rows of w bytes
-    const size_t plane = (y / 2) * (w / 2) + x / 2;   // YV12, YUVP: planes with rows of w / 2 bytes
+    const size_t pair = (y / 2) * w + (x / 2) * 2;   // NV12, NV21: U,V pairs in rows of w bytes
+    const size_t plane = (y / 2) * (w / 2) + x / 2;  // YV12, YUVP: planes with rows of w / 2 bytes
     const uint8_t luma = image.data[y * w + x];
     switch (image.format) {
         case QK_FORMAT_NV12: return {luma, d[pair], d[pair + 1]};
@@ -85,8 +95,9 @@ inline std::tuple<uint8_t, uint8_t, uint8_t> yuv_at(const QKImage& image, int32_
     }
 }
 
-constexpr uint32_t kYuv420Formats[] = {QK_FORMAT_NV12, QK_FORMAT_NV21, QK_FORMAT_YV12, QK_FORMAT_YUVP};
+constexpr uint32_t kDrawFormats[] = {QK_FORMAT_RGBA, QK_FORMAT_RGB8, QK_FORMAT_NV12,
+                                     QK_FORMAT_NV21, QK_FORMAT_YV12, QK_FORMAT_YUVP};
 
 }  // namespace qktest
 
-#endif  // QKCORE_TESTS_GEOMETRY_IMAGES_H
+#endif  // QKCORE_TESTS_SUPPORT_IMAGES_H
