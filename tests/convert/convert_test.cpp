@@ -63,6 +63,7 @@ TEST(Convert, RefusalsLeaveTheDestinationsBytesAsTheyWere) {
         {"destination one byte short", {RGBA, 4, 4, 64}, {BGRA, 4, 4, 64, 63}, SIZE},
         {"destination chroma past its buffer", {RGBA, 16, 8, 512}, {NV12, 16, 8, 319, 319, 256}, SIZE},
         {"source chroma past its recorded size", {NV21, 16, 8, 319, 319, 256}, {RGBA, 16, 8, 512}, SIZE},
+        {"source recording fewer bytes than its picture", {RGBA, 4, 4, 64, 63}, {BGRA, 4, 4, 64}, SIZE},
         {"D16 to GREY", {D16, 4, 2, 256}, {GREY, 2, 2, 256, 256}, NONE},
         {"PCL to RGBA", {PCL, 4, 2, 256}, {RGBA, 2, 2, 256, 256}, NONE},
         {"RGBA to D16", {RGBA, 4, 2, 256}, {D16, 2, 2, 256, 256}, NONE},
