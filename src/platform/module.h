@@ -11,8 +11,6 @@ public:
     // Opens the library by file name with immediate binding; an empty Module
     // when it cannot be loaded.
     static Module open(const char* file_name);
-    // Takes over a handle that an earlier Module released.
-    static Module adopt(void* handle) { return Module(handle); }
 
     Module(Module&& other) noexcept : handle_(other.handle_) { other.handle_ = nullptr; }
     Module& operator=(Module&& other) noexcept;
@@ -29,12 +27,6 @@ public:
         return reinterpret_cast<Fn>(symbol(name));
     }
 
-    // Gives up ownership: the caller closes the handle (or adopts it again).
-    void* release() {
-        void* handle = handle_;
-        handle_ = nullptr;
-        return handle;
-    }
     void close();
 
 private:
