@@ -1,24 +1,17 @@
 // Pixel-format conversion through QKImage_convert, one benchmark per kernel
-// family at 1920x1080 and 4000x3000, with a plain memcpy of the destination's
-// bytes beside them as the yardstick.
+// family at 1920x1080 and 4000x3000. Yardstick: BM_Memcpy in image_bench.cpp.
 #include <benchmark/benchmark.h>
 #include <string.h>
 
 #include <random>
 #include <vector>
 
+#include "bench_util.h"
 #include "qkcore/qk_image.h"
-#include "qkcore/qk_log.h"
 
 namespace {
 
-int silent_log(int, ...) { return 0; }
-
-void set_pixel_rate(benchmark::State& state, int32_t width, int32_t height, uint64_t bytes) {
-    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * bytes));
-    state.counters["Mpixel/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * width * height / 1e6,
-                                                    benchmark::Counter::kIsRate);
-}
+using namespace qkbench;
 
 QKImage* random_image(int32_t width, int32_t height, uint32_t format) {
     QKImage* image = QKImage_createNew(width, height, format);
@@ -30,8 +23,7 @@ QKImage* random_image(int32_t width, int32_t height, uint32_t format) {
 void BM_Convert(benchmark::State& state, uint32_t from, uint32_t to) {
     const int32_t width = static_cast<int32_t>(state.range(0));
     const int32_t height = static_cast<int32_t>(state.range(1));
-    const QKLogFn saved = HX_LogMsg;
-    HX_LogMsg = silent_log;  // the start line of every call is not what we measure
+    QuietLog quiet;  // the start line of every call is not what we measure
     QKImage* src = random_image(width, height, from);
     QKImage* dst = QKImage_createNew(width, height, to);
     for (auto _ : state) {
@@ -39,27 +31,9 @@ void BM_Convert(benchmark::State& state, uint32_t from, uint32_t to) {
         benchmark::DoNotOptimize(dst->data);
         benchmark::ClobberMemory();
     }
-    set_pixel_rate(state, width, height, dst->size);
+    set_rates(state, int64_t{width} * height, dst->size);
     QKImage_destroy(src);
     QKImage_destroy(dst);
-    HX_LogMsg = saved;
-}
-
-void BM_ConvertMemcpy(benchmark::State& state, uint32_t format) {
-    const int32_t width = static_cast<int32_t>(state.range(0));
-    const int32_t height = static_cast<int32_t>(state.range(1));
-    const uint64_t bytes = QKImage_requiredSize(width, height, format);
-    std::vector<uint8_t> source(bytes, 1), destination(bytes, 0);
-    for (auto _ : state) {
-        memcpy(destination.data(), source.data(), bytes);
-        benchmark::DoNotOptimize(destination.data());
-        benchmark::ClobberMemory();
-    }
-    set_pixel_rate(state, width, height, bytes);
-}
-
-void frame_sizes(benchmark::internal::Benchmark* benchmark) {
-    benchmark->Args({1920, 1080})->Args({4000, 3000})->Unit(benchmark::kMillisecond);
 }
 
 #define QK_CONVERT_BENCH(name, from, to) BENCHMARK_CAPTURE(BM_Convert, name, from, to)->Apply(frame_sizes)
@@ -86,8 +60,5 @@ QK_CONVERT_BENCH(rgb8_to_rgba, QK_FORMAT_RGB8, QK_FORMAT_RGBA);
 // Same format
 QK_CONVERT_BENCH(copy_nv21, QK_FORMAT_NV21, QK_FORMAT_NV21);
 QK_CONVERT_BENCH(copy_rgba, QK_FORMAT_RGBA, QK_FORMAT_RGBA);
-// Yardsticks
-BENCHMARK_CAPTURE(BM_ConvertMemcpy, nv21, QK_FORMAT_NV21)->Apply(frame_sizes);
-BENCHMARK_CAPTURE(BM_ConvertMemcpy, rgba, QK_FORMAT_RGBA)->Apply(frame_sizes);
 
 }  // namespace

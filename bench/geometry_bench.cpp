@@ -6,27 +6,14 @@
 #include <stdlib.h>
 #include <string.h>
 
+#include "bench_util.h"
 #include "platform/memory.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
-#include "qkcore/qk_log.h"
 
 namespace {
 
-constexpr int32_t kWidth = 4000;
-constexpr int32_t kHeight = 3000;
-
-int quiet_log(int, ...) { return 0; }
-
-// Silences the per-call parameter messages for the benchmark's duration.
-class QuietLog {
-public:
-    QuietLog() : saved_(HX_LogMsg) { HX_LogMsg = quiet_log; }
-    ~QuietLog() { HX_LogMsg = saved_; }
-
-private:
-    QKLogFn saved_;
-};
+using namespace qkbench;
 
 QKImage* make_frame(int32_t width, int32_t height, uint32_t format) {
     QKImage* image = QKImage_createNew(width, height, format);
@@ -35,11 +22,6 @@ QKImage* make_frame(int32_t width, int32_t height, uint32_t format) {
         for (uint64_t i = 3; i < image->size; i += 4) image->data[i] = 255;  // opaque: the camera case
     }
     return image;
-}
-
-void set_counters(benchmark::State& state, int64_t pixels) {
-    state.counters["Mpixel/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * pixels / 1e6,
-                                                    benchmark::Counter::kIsRate);
 }
 
 void BM_Rotate(benchmark::State& state, uint32_t format, int32_t angle) {
@@ -54,7 +36,7 @@ void BM_Rotate(benchmark::State& state, uint32_t format, int32_t angle) {
         benchmark::DoNotOptimize(image->data);
         benchmark::ClobberMemory();
     }
-    set_counters(state, int64_t{kWidth} * kHeight);
+    set_rates(state, int64_t{kWidth} * kHeight);
     QKImage_destroy(image);
 }
 BENCHMARK_CAPTURE(BM_Rotate, rgba_90, QK_FORMAT_RGBA, 90)->Unit(benchmark::kMillisecond);
@@ -106,7 +88,7 @@ void BM_RasterQuarterTurnDraw(benchmark::State& state, int quarter_turns, int32_
         benchmark::DoNotOptimize(target.pixels());
         benchmark::ClobberMemory();
     }
-    set_counters(state, int64_t{kWidth} * kHeight);
+    set_rates(state, int64_t{kWidth} * kHeight);
     QKImage_destroy(image);
 }
 BENCHMARK_CAPTURE(BM_RasterQuarterTurnDraw, angle_90, 3, kWidth / 2)->Unit(benchmark::kMillisecond);
@@ -127,7 +109,7 @@ void BM_Scale(benchmark::State& state, int32_t width, int32_t height) {
         benchmark::DoNotOptimize(target->data);
         benchmark::ClobberMemory();
     }
-    set_counters(state, int64_t{width} * height);
+    set_rates(state, int64_t{width} * height);
     QKImage_destroy(target);
     QKImage_destroy(source);
 }
@@ -147,8 +129,7 @@ void BM_Crop(benchmark::State& state, uint32_t format) {
         benchmark::DoNotOptimize(target->data);
         benchmark::ClobberMemory();
     }
-    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * target->size));
-    set_counters(state, int64_t{kWidth / 2} * (kHeight / 2));
+    set_rates(state, int64_t{kWidth / 2} * (kHeight / 2), target->size);
     QKImage_destroy(target);
     QKImage_destroy(source);
 }
@@ -167,8 +148,7 @@ void BM_Draw(benchmark::State& state, uint32_t format) {
         benchmark::DoNotOptimize(frame->data);
         benchmark::ClobberMemory();
     }
-    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * picture->size));
-    set_counters(state, int64_t{kWidth / 2} * (kHeight / 2));
+    set_rates(state, int64_t{kWidth / 2} * (kHeight / 2), picture->size);
     QKImage_destroy(frame);
     QKImage_destroy(picture);
 }

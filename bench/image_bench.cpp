@@ -4,31 +4,28 @@
 
 #include <vector>
 
+#include "bench_util.h"
 #include "qkcore/qk_image.h"
 
 namespace {
 
-constexpr int32_t kWidth = 4000;
-constexpr int32_t kHeight = 3000;
+using namespace qkbench;
 
-void set_frame_counters(benchmark::State& state, uint64_t bytes) {
-    state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * bytes));
-    state.counters["Mpixel/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * kWidth * kHeight / 1e6,
-                                                    benchmark::Counter::kIsRate);
-}
-
+// The yardstick of every frame operation: one plain memcpy of the frame.
 void BM_Memcpy(benchmark::State& state, uint32_t format) {
-    const uint64_t bytes = QKImage_requiredSize(kWidth, kHeight, format);
+    const int32_t width = static_cast<int32_t>(state.range(0));
+    const int32_t height = static_cast<int32_t>(state.range(1));
+    const uint64_t bytes = QKImage_requiredSize(width, height, format);
     std::vector<uint8_t> source(bytes, 1), destination(bytes, 0);
     for (auto _ : state) {
         memcpy(destination.data(), source.data(), bytes);
         benchmark::DoNotOptimize(destination.data());
         benchmark::ClobberMemory();
     }
-    set_frame_counters(state, bytes);
+    set_rates(state, int64_t{width} * height, bytes);
 }
-BENCHMARK_CAPTURE(BM_Memcpy, rgba_4000x3000, QK_FORMAT_RGBA)->Unit(benchmark::kMillisecond);
-BENCHMARK_CAPTURE(BM_Memcpy, nv21_4000x3000, QK_FORMAT_NV21)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Memcpy, rgba, QK_FORMAT_RGBA)->Apply(frame_sizes);
+BENCHMARK_CAPTURE(BM_Memcpy, nv21, QK_FORMAT_NV21)->Apply(frame_sizes);
 
 void BM_Clone(benchmark::State& state, uint32_t format) {
     QKImage* source = QKImage_createNew(kWidth, kHeight, format);
@@ -38,7 +35,7 @@ void BM_Clone(benchmark::State& state, uint32_t format) {
         benchmark::DoNotOptimize(clone->data);
         QKImage_destroy(clone);
     }
-    set_frame_counters(state, source->size);
+    set_rates(state, int64_t{kWidth} * kHeight, source->size);
     QKImage_destroy(source);
 }
 BENCHMARK_CAPTURE(BM_Clone, rgba_4000x3000, QK_FORMAT_RGBA)->Unit(benchmark::kMillisecond);
