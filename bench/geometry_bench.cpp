@@ -3,11 +3,9 @@
 // should stay within three times two frame copies) and BM_MemcpyRows below
 // (crop and draw should run at the speed of one memcpy per row).
 #include <benchmark/benchmark.h>
-#include <stdlib.h>
 #include <string.h>
 
 #include "bench_util.h"
-#include "platform/memory.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
 
@@ -44,40 +42,9 @@ BENCHMARK_CAPTURE(BM_Rotate, rgba_180, QK_FORMAT_RGBA, 180)->Unit(benchmark::kMi
 BENCHMARK_CAPTURE(BM_Rotate, rgba_270, QK_FORMAT_RGBA, 270)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(BM_Rotate, nv21_90, QK_FORMAT_NV21, 90)->Unit(benchmark::kMillisecond);
 
-// The two halves of a quarter turn's cost, for comparison with BM_Rotate: a
-// fresh frame-sized bitmap (mapped and first touched), and the turned
-// drawing alone between bitmaps that already exist.
-void BM_RasterFreshBitmap(benchmark::State& state) {
-    for (auto _ : state) {
-        qk::platform::Bitmap bitmap;
-        if (!bitmap.allocate(kHeight, kWidth, /*cleared=*/true)) {
-            state.SkipWithError("no memory");
-            break;
-        }
-        for (uint64_t i = 0; i < bitmap.byte_count(); i += 4096) bitmap.pixels()[i] = 1;
-        benchmark::DoNotOptimize(bitmap.pixels());
-    }
-}
-BENCHMARK(BM_RasterFreshBitmap)->Unit(benchmark::kMillisecond);
-
-// The quarter turn's budget with the memory a turn really uses: the frame
-// copied into fresh pixel memory and back (BM_Memcpy copies between buffers
-// that are already mapped).
-void BM_CopyOutAndBack(benchmark::State& state) {
-    QKImage* image = make_frame(kWidth, kHeight, QK_FORMAT_RGBA);
-    for (auto _ : state) {
-        void* aside = qk::platform::allocate_pixels(image->size);
-        memcpy(aside, image->data, image->size);
-        memcpy(image->data, aside, image->size);
-        benchmark::DoNotOptimize(image->data);
-        free(aside);
-    }
-    QKImage_destroy(image);
-}
-BENCHMARK(BM_CopyOutAndBack)->Unit(benchmark::kMillisecond);
-
-// The library's angle 90 is three clockwise quarter turns about (W/2, W/2);
-// its angle 270 one about (H/2, H/2).
+// The raster layer's turned drawing alone, blending onto a bitmap that
+// already exists. The library's angle 90 is three clockwise quarter turns
+// about (W/2, W/2); its angle 270 one about (H/2, H/2).
 void BM_RasterQuarterTurnDraw(benchmark::State& state, int quarter_turns, int32_t pivot) {
     QKImage* image = make_frame(kWidth, kHeight, QK_FORMAT_RGBA);
     qk::platform::Bitmap source, target;

@@ -39,23 +39,17 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
     // same bytes.
     if (orient == 0) return QK_OK;
 
-    platform::Bitmap source;
-    source.borrow(image->data, width, height);
-    // A half turn exchanges pixel pairs: no second bitmap needed.
-    if (orient == 2) {
-        platform::turn_half_in_place(source, pivot_x, pivot_y);
-        return QK_OK;
-    }
-    // Cleared, so that the uncovered row or column ends up transparent black
-    // and translucent pixels arrive unchanged.
-    platform::Bitmap output;
-    if (!output.allocate(out_width, out_height, /*cleared=*/true)) return QK_FAIL(QK_ERROR_ALLOC_FAILED);
+    platform::Bitmap picture;
+    picture.borrow(image->data, width, height);
     // The raster layer turns clockwise: the library's counter-clockwise angle
-    // is negated.
-    platform::draw_turned(source, -(angle / 90), pivot_x, pivot_y, output);
+    // is negated. The pixels are those of drawing onto a cleared bitmap, so
+    // the uncovered row or column ends up transparent black and translucent
+    // pixels arrive unchanged.
+    if (!platform::turn_in_place(picture, -(angle / 90), pivot_x, pivot_y)) {
+        return QK_FAIL(QK_ERROR_ALLOC_FAILED);
+    }
     image->width = out_width;
     image->height = out_height;
-    output.copy_to(image->data, buffer_size);
     return QK_OK;
 }
 

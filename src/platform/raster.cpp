@@ -48,6 +48,20 @@ inline void blend_run(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int64_t 
     for (int64_t i = 0; i < count; ++i) blend_pixel(dst + i * kBitmapBytesPerPixel, src + i * step);
 }
 
+// Copies `count` source pixels, `step` bytes apart, onto consecutive pixels.
+inline void copy_run(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int64_t count) {
+    for (int64_t i = 0; i < count; ++i) memcpy(dst + i * kBitmapBytesPerPixel, src + i * step, kBitmapBytesPerPixel);
+}
+
+template <bool kBlend>
+inline void put_run(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int64_t count) {
+    if constexpr (kBlend) {
+        blend_run(dst, src, step, count);
+    } else {
+        copy_run(dst, src, step, count);
+    }
+}
+
 // Four pixels as one vector (GCC and Clang vector extensions: SSE2 on x86,
 // NEON on ARM).
 typedef uint32_t Lanes __attribute__((vector_size(16)));
@@ -68,8 +82,10 @@ inline uint32_t alpha_mask() {
 
 // Turns a 4x4 block: target pixel (c + j, r + i), at dst + i rows + j
 // pixels, shows the source pixel at src + i * step_r + j * step_c, step_r
-// being one pixel forwards or backwards. An opaque block is transposed four
-// pixels at a time; any other blends pixel by pixel.
+// being one pixel forwards or backwards. Copied, the block is transposed four
+// pixels at a time; blended, so is an opaque one, and any other goes pixel by
+// pixel.
+template <bool kBlend>
 inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, ptrdiff_t step_c, ptrdiff_t step_r) {
     const bool backwards = step_r < 0;
     const uint8_t* first = backwards ? src + 3 * step_r : src;
@@ -77,11 +93,13 @@ inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, p
     Lanes v1 = load_lanes(first + step_c);
     Lanes v2 = load_lanes(first + 2 * step_c);
     Lanes v3 = load_lanes(first + 3 * step_c);
-    const Lanes all = v0 & v1 & v2 & v3;
-    const uint32_t mask = alpha_mask();
-    if ((all[0] & all[1] & all[2] & all[3] & mask) != mask) {
-        for (int i = 0; i < 4; ++i) blend_run(dst + i * dst_row_bytes, src + i * step_r, step_c, 4);
-        return;
+    if constexpr (kBlend) {
+        const Lanes all = v0 & v1 & v2 & v3;
+        const uint32_t mask = alpha_mask();
+        if ((all[0] & all[1] & all[2] & all[3] & mask) != mask) {
+            for (int i = 0; i < 4; ++i) blend_run(dst + i * dst_row_bytes, src + i * step_r, step_c, 4);
+            return;
+        }
     }
     if (backwards) {
         v0 = __builtin_shufflevector(v0, v0, 3, 2, 1, 0);
@@ -99,14 +117,163 @@ inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, p
     for (int i = 0; i < 4; ++i) memcpy(dst + i * dst_row_bytes, &rows[i], sizeof(Lanes));
 }
 
-// The values u with 0 <= a + k * u < n, for k = +1 or -1, as [lo, hi).
+// The integers from lo up to, not including, hi.
 struct Span {
     int64_t lo;
     int64_t hi;
 };
-Span solve(int64_t a, int k, int64_t n) {
-    if (k > 0) return {-a, n - a};
-    return {a - n + 1, a + 1};
+
+// The values u with lo <= a + k * u < hi, k being +1 or -1.
+Span solve(int64_t a, int k, int64_t lo, int64_t hi) {
+    if (k > 0) return {lo - a, hi - a};
+    return {a - hi + 1, a - lo + 1};
+}
+
+struct Rect {
+    Span cols;
+    Span rows;
+    bool empty() const { return cols.lo >= cols.hi || rows.lo >= rows.hi; }
+};
+
+// Target pixel (c, r) of a turn shows the source pixel under its centre
+// mapped back: sx = x0 + xc * c + xr * r, sy = y0 + yc * c + yr * r. The
+// centres land on half-integers, never on a pixel edge, so integers are exact.
+struct TurnMap {
+    int64_t x0 = 0, y0 = 0;
+    int xc = 1, xr = 0, yc = 0, yr = 1;
+};
+
+TurnMap turn_map(int quarter_turns, int32_t pivot_x, int32_t pivot_y) {
+    const int64_t px = pivot_x;
+    const int64_t py = pivot_y;
+    TurnMap m;
+    switch (((quarter_turns % 4) + 4) % 4) {
+        case 0: break;
+        case 1: m.x0 = px - py, m.xc = 0, m.xr = 1, m.y0 = px + py - 1, m.yc = -1, m.yr = 0; break;
+        case 2: m.x0 = 2 * px - 1, m.xc = -1, m.xr = 0, m.y0 = 2 * py - 1, m.yc = 0, m.yr = -1; break;
+        case 3: m.x0 = px + py - 1, m.xc = 0, m.xr = -1, m.y0 = py - px, m.yc = 1, m.yr = 0; break;
+    }
+    return m;
+}
+
+// What a drawing reads: columns [x_lo, x_hi) of every row of the source
+// picture, pixel (x, y) at `pixels` + y rows + (x - x_lo) pixels.
+struct SourceView {
+    const uint8_t* pixels;
+    size_t row_bytes;
+    int64_t x_lo, x_hi, height;
+    const uint8_t* at(int64_t x, int64_t y) const {
+        return pixels + y * row_bytes + (x - x_lo) * kBitmapBytesPerPixel;
+    }
+};
+
+// What a drawing writes: rows [r_lo, r_hi) of the target picture, pixel
+// (c, r) at `pixels` + (r - r_lo) rows + c pixels.
+struct TargetView {
+    uint8_t* pixels;
+    size_t row_bytes;
+    int64_t width, r_lo, r_hi;
+    uint8_t* at(int64_t c, int64_t r) const { return pixels + (r - r_lo) * row_bytes + c * kBitmapBytesPerPixel; }
+};
+
+SourceView whole_source(const Bitmap& bitmap) {
+    return {bitmap.pixels(), bitmap.row_bytes(), 0, bitmap.width(), bitmap.height()};
+}
+
+TargetView whole_target(Bitmap& bitmap) {
+    return {bitmap.pixels(), bitmap.row_bytes(), bitmap.width(), 0, bitmap.height()};
+}
+
+// Draws the turn of `source` onto `target` (copies, or blends source-over)
+// and returns the rectangle of target pixels it covered.
+template <bool kBlend>
+Rect draw_turn(const TurnMap& m, const SourceView& source, const TargetView& target) {
+    // Each source coordinate follows one target coordinate, so the covered
+    // target pixels form a rectangle.
+    Span cols = m.xc != 0 ? solve(m.x0, m.xc, source.x_lo, source.x_hi) : solve(m.y0, m.yc, 0, source.height);
+    Span rows = m.xr != 0 ? solve(m.x0, m.xr, source.x_lo, source.x_hi) : solve(m.y0, m.yr, 0, source.height);
+    const Rect rect{{std::max<int64_t>(cols.lo, 0), std::min<int64_t>(cols.hi, target.width)},
+                    {std::max<int64_t>(rows.lo, target.r_lo), std::min<int64_t>(rows.hi, target.r_hi)}};
+    if (rect.empty()) return rect;
+
+    const ptrdiff_t row_bytes = static_cast<ptrdiff_t>(source.row_bytes);
+    const ptrdiff_t step_c = m.xc * kBitmapBytesPerPixel + m.yc * row_bytes;
+    const ptrdiff_t step_r = m.xr * kBitmapBytesPerPixel + m.yr * row_bytes;
+    auto source_at = [&](int64_t c, int64_t r) {
+        return source.at(m.x0 + m.xc * c + m.xr * r, m.y0 + m.yc * c + m.yr * r);
+    };
+    if (m.xc != 0) {  // no turn or a half turn: source rows run along target rows
+        for (int64_t r = rect.rows.lo; r < rect.rows.hi; ++r) {
+            put_run<kBlend>(target.at(rect.cols.lo, r), source_at(rect.cols.lo, r), step_c,
+                            rect.cols.hi - rect.cols.lo);
+        }
+        return rect;
+    }
+    // A quarter turn reads the source down its columns. Tiles of 16 target
+    // rows (one cache line of each source row) by 256 target columns keep
+    // the lines they read in cache; inside, 4x4 blocks are transposed whole.
+    constexpr int64_t kTileRows = 16;
+    constexpr int64_t kTileCols = 256;
+    for (int64_t r0 = rect.rows.lo; r0 < rect.rows.hi; r0 += kTileRows) {
+        const int64_t r1 = std::min(r0 + kTileRows, rect.rows.hi);
+        for (int64_t c0 = rect.cols.lo; c0 < rect.cols.hi; c0 += kTileCols) {
+            const int64_t c1 = std::min(c0 + kTileCols, rect.cols.hi);
+            int64_t r = r0;
+            for (; r + 4 <= r1; r += 4) {
+                int64_t c = c0;
+                for (; c + 4 <= c1; c += 4) {
+                    turn_block<kBlend>(target.at(c, r), target.row_bytes, source_at(c, r), step_c, step_r);
+                }
+                for (int64_t i = 0; i < 4; ++i) {
+                    put_run<kBlend>(target.at(c, r + i), source_at(c, r + i), step_c, c1 - c);
+                }
+            }
+            for (; r < r1; ++r) put_run<kBlend>(target.at(c0, r), source_at(c0, r), step_c, c1 - c0);
+        }
+    }
+    return rect;
+}
+
+// Makes every target pixel outside `drawn` transparent black.
+void clear_outside(const TargetView& target, const Rect& drawn) {
+    const size_t row_bytes = static_cast<size_t>(target.width) * kBitmapBytesPerPixel;
+    for (int64_t r = target.r_lo; r < target.r_hi; ++r) {
+        if (drawn.empty() || r < drawn.rows.lo || r >= drawn.rows.hi) {
+            memset(target.at(0, r), 0, row_bytes);
+            continue;
+        }
+        memset(target.at(0, r), 0, static_cast<size_t>(drawn.cols.lo) * kBitmapBytesPerPixel);
+        memset(target.at(drawn.cols.hi, r), 0,
+               static_cast<size_t>(target.width - drawn.cols.hi) * kBitmapBytesPerPixel);
+    }
+}
+
+// A half turn exchanges pixel pairs: no second bitmap needed.
+void turn_half_in_place(Bitmap& bitmap, int32_t pivot_x, int32_t pivot_y) {
+    // Pixel (c, r) takes (2 px - 1 - c, 2 py - 1 - r): an exchange of pairs
+    // inside the covered rectangle, which maps onto itself.
+    const int64_t cx = 2 * int64_t{pivot_x} - 1;
+    const int64_t cy = 2 * int64_t{pivot_y} - 1;
+    const int64_t width = bitmap.width(), height = bitmap.height();
+    const Rect covered{{std::max<int64_t>(0, cx + 1 - width), std::min<int64_t>(width, cx + 1)},
+                       {std::max<int64_t>(0, cy + 1 - height), std::min<int64_t>(height, cy + 1)}};
+    const TargetView all = whole_target(bitmap);
+    if (!covered.empty()) {
+        // cy is odd, so no row is its own partner.
+        for (int64_t r = covered.rows.lo; r < cy - r; ++r) {
+            uint8_t* top = all.at(0, r);
+            uint8_t* bottom = all.at(0, cy - r);
+            for (int64_t c = covered.cols.lo; c < covered.cols.hi; ++c) {
+                uint8_t* a = top + c * kBitmapBytesPerPixel;
+                uint8_t* b = bottom + (cx - c) * kBitmapBytesPerPixel;
+                uint8_t held[kBitmapBytesPerPixel];
+                memcpy(held, a, kBitmapBytesPerPixel);
+                memcpy(a, b, kBitmapBytesPerPixel);
+                memcpy(b, held, kBitmapBytesPerPixel);
+            }
+        }
+    }
+    clear_outside(all, covered);
 }
 
 }  // namespace
@@ -154,100 +321,48 @@ bool Bitmap::copy_to(void* out, uint64_t capacity) const {
 
 void draw_turned(const Bitmap& source, int quarter_turns, int32_t pivot_x, int32_t pivot_y, Bitmap& target) {
     if (!source.has_pixels() || !target.has_pixels()) return;
-    const int64_t px = pivot_x;
-    const int64_t py = pivot_y;
-    // Target pixel (c, r) shows the source pixel under its centre mapped back:
-    // sx = x0 + xc * c + xr * r, sy = y0 + yc * c + yr * r. The centres land
-    // on half-integers, never on a pixel edge, so integers are exact.
-    int64_t x0 = 0, y0 = 0;
-    int xc = 1, xr = 0, yc = 0, yr = 1;
-    switch (((quarter_turns % 4) + 4) % 4) {
-        case 0: break;
-        case 1: x0 = px - py, xc = 0, xr = 1, y0 = px + py - 1, yc = -1, yr = 0; break;
-        case 2: x0 = 2 * px - 1, xc = -1, xr = 0, y0 = 2 * py - 1, yc = 0, yr = -1; break;
-        case 3: x0 = px + py - 1, xc = 0, xr = -1, y0 = py - px, yc = 1, yr = 0; break;
-    }
-
-    // Each source coordinate follows one target coordinate, so the covered
-    // target pixels form a rectangle.
-    const int64_t sw = source.width();
-    const int64_t sh = source.height();
-    Span cols = xc != 0 ? solve(x0, xc, sw) : solve(y0, yc, sh);
-    Span rows = xr != 0 ? solve(x0, xr, sw) : solve(y0, yr, sh);
-    cols = {std::max<int64_t>(cols.lo, 0), std::min<int64_t>(cols.hi, target.width())};
-    rows = {std::max<int64_t>(rows.lo, 0), std::min<int64_t>(rows.hi, target.height())};
-    if (cols.lo >= cols.hi || rows.lo >= rows.hi) return;
-
-    const ptrdiff_t step_c = (xc + yc * sw) * kBitmapBytesPerPixel;
-    const ptrdiff_t step_r = (xr + yr * sw) * kBitmapBytesPerPixel;
-    auto source_at = [&](int64_t c, int64_t r) {
-        return source.row(static_cast<int32_t>(y0 + yc * c + yr * r)) + (x0 + xc * c + xr * r) * kBitmapBytesPerPixel;
-    };
-    auto target_at = [&](int64_t c, int64_t r) { return target.row(static_cast<int32_t>(r)) + c * kBitmapBytesPerPixel; };
-    if (xc != 0) {  // no turn or a half turn: source rows run along target rows
-        for (int64_t r = rows.lo; r < rows.hi; ++r) {
-            blend_run(target_at(cols.lo, r), source_at(cols.lo, r), step_c, cols.hi - cols.lo);
-        }
-        return;
-    }
-    // A quarter turn reads the source down its columns. Tiles of 16 target
-    // rows (one cache line of each source row) by 256 target columns keep
-    // the lines they read in cache; inside, 4x4 blocks are transposed whole.
-    constexpr int64_t kTileRows = 16;
-    constexpr int64_t kTileCols = 256;
-    for (int64_t r0 = rows.lo; r0 < rows.hi; r0 += kTileRows) {
-        const int64_t r1 = std::min(r0 + kTileRows, rows.hi);
-        for (int64_t c0 = cols.lo; c0 < cols.hi; c0 += kTileCols) {
-            const int64_t c1 = std::min(c0 + kTileCols, cols.hi);
-            int64_t r = r0;
-            for (; r + 4 <= r1; r += 4) {
-                int64_t c = c0;
-                for (; c + 4 <= c1; c += 4) {
-                    turn_block(target_at(c, r), target.row_bytes(), source_at(c, r), step_c, step_r);
-                }
-                for (int64_t i = 0; i < 4; ++i) blend_run(target_at(c, r + i), source_at(c, r + i), step_c, c1 - c);
-            }
-            for (; r < r1; ++r) blend_run(target_at(c0, r), source_at(c0, r), step_c, c1 - c0);
-        }
-    }
+    draw_turn<true>(turn_map(quarter_turns, pivot_x, pivot_y), whole_source(source), whole_target(target));
 }
 
-void turn_half_in_place(Bitmap& bitmap, int32_t pivot_x, int32_t pivot_y) {
-    if (!bitmap.has_pixels()) return;
-    // Pixel (c, r) takes (2 px - 1 - c, 2 py - 1 - r): an exchange of pairs
-    // inside the covered rectangle, which maps onto itself.
-    const int64_t cx = 2 * int64_t{pivot_x} - 1;
-    const int64_t cy = 2 * int64_t{pivot_y} - 1;
+bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t pivot_y) {
+    if (!bitmap.has_pixels()) return false;
+    if (quarter_turns % 2 == 0) {
+        if (quarter_turns % 4 != 0) turn_half_in_place(bitmap, pivot_x, pivot_y);
+        return true;
+    }
+    const TurnMap m = turn_map(quarter_turns, pivot_x, pivot_y);
     const int64_t width = bitmap.width(), height = bitmap.height();
-    const Span cols{std::max<int64_t>(0, cx + 1 - width), std::min<int64_t>(width, cx + 1)};
-    const Span rows{std::max<int64_t>(0, cy + 1 - height), std::min<int64_t>(height, cy + 1)};
-    if (cols.lo >= cols.hi || rows.lo >= rows.hi) {
-        bitmap.clear();
-        return;
+    // The turned picture is `height` wide and `width` high. Its bottom rows
+    // are drawn into memory of their own first; then the top rows need only
+    // some source columns, which are gathered at the end of the buffer, clear
+    // of where the top rows go, and drawn from there.
+    const int32_t turned_width = bitmap.height(), turned_height = bitmap.width();
+    const int64_t top = turned_height / 2;
+    Bitmap bottom;
+    if (!bottom.allocate(turned_width, static_cast<int32_t>(turned_height - top), /*cleared=*/true)) return false;
+    draw_turn<false>(m, whole_source(bitmap),
+                     TargetView{bottom.pixels(), bottom.row_bytes(), turned_width, top, turned_height});
+
+    // The top rows show source columns x0 + xr * r, r in [0, top): at most
+    // `top` of them, so top + kept <= width and the two never meet.
+    const int64_t first = m.xr > 0 ? m.x0 : m.x0 - top + 1;
+    const int64_t lo = std::clamp<int64_t>(first, 0, width);
+    const int64_t hi = std::clamp<int64_t>(first + top, lo, width);
+    const size_t kept_row_bytes = static_cast<size_t>(hi - lo) * kBitmapBytesPerPixel;
+    uint8_t* const kept = bitmap.pixels() + bitmap.byte_count() - kept_row_bytes * static_cast<size_t>(height);
+    // Every row moves towards the end (the gathered picture ends where the
+    // buffer does and its rows are shorter), so the last row moves first and
+    // none lands on a row still to move.
+    for (int64_t y = height - 1; y >= 0; --y) {
+        const uint8_t* columns = bitmap.row(static_cast<int32_t>(y)) + lo * kBitmapBytesPerPixel;
+        memmove(kept + static_cast<size_t>(y) * kept_row_bytes, columns, kept_row_bytes);
     }
-    auto at = [&](int64_t c, int64_t r) { return bitmap.row(static_cast<int32_t>(r)) + c * kBitmapBytesPerPixel; };
-    // cy is odd, so no row is its own partner.
-    for (int64_t r = rows.lo; r < cy - r; ++r) {
-        uint8_t* top = at(0, r);
-        uint8_t* bottom = at(0, cy - r);
-        for (int64_t c = cols.lo; c < cols.hi; ++c) {
-            uint8_t* a = top + c * kBitmapBytesPerPixel;
-            uint8_t* b = bottom + (cx - c) * kBitmapBytesPerPixel;
-            uint8_t held[kBitmapBytesPerPixel];
-            memcpy(held, a, kBitmapBytesPerPixel);
-            memcpy(a, b, kBitmapBytesPerPixel);
-            memcpy(b, held, kBitmapBytesPerPixel);
-        }
-    }
-    // What the turned picture does not cover.
-    for (int64_t r = 0; r < height; ++r) {
-        if (r < rows.lo || r >= rows.hi) {
-            memset(at(0, r), 0, bitmap.row_bytes());
-            continue;
-        }
-        memset(at(0, r), 0, static_cast<size_t>(cols.lo) * kBitmapBytesPerPixel);
-        memset(at(cols.hi, r), 0, static_cast<size_t>(width - cols.hi) * kBitmapBytesPerPixel);
-    }
+    const TargetView top_rows{bitmap.pixels(), bottom.row_bytes(), turned_width, 0, top};
+    clear_outside(top_rows, draw_turn<false>(m, SourceView{kept, kept_row_bytes, lo, hi, height}, top_rows));
+    memcpy(top_rows.at(0, top), bottom.pixels(), bottom.byte_count());
+    bitmap.width_ = turned_width;
+    bitmap.height_ = turned_height;
+    return true;
 }
 
 void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& target) {

@@ -55,6 +55,8 @@ public:
     bool copy_to(void* out, uint64_t capacity) const;
 
 private:
+    friend bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t pivot_y);
+
     uint8_t* pixels_ = nullptr;
     int32_t width_ = 0;
     int32_t height_ = 0;
@@ -67,11 +69,12 @@ private:
 // Target pixels that no source pixel covers are left as they are.
 void draw_turned(const Bitmap& source, int quarter_turns, int32_t pivot_x, int32_t pivot_y, Bitmap& target);
 
-// Turns the bitmap half a turn about the integer pivot in place. The pixels
-// are those of drawing it turned onto a cleared bitmap of the same size
-// (pixels that nothing covers become transparent black), without a second
-// bitmap.
-void turn_half_in_place(Bitmap& bitmap, int32_t pivot_x, int32_t pivot_y);
+// Turns the bitmap by quarter_turns x 90 degrees about the integer pivot in
+// place; after an odd number of turns it is height wide and width high. The
+// pixels are those of drawing it turned onto a cleared bitmap of that size;
+// a quarter turn takes memory for half of one more. False, and the bitmap
+// unchanged, when it has no pixels or that memory cannot be had.
+bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t pivot_y);
 
 // Draws `source` scaled by the factors: target pixel (c, r) takes the source
 // pixel under its centre mapped back, ((c + 0.5) / scale_x, (r + 0.5) /

@@ -69,12 +69,13 @@ TEST(Raster, DrawingBlendsSourceOver) {
 
 // Forward reference: the centre of source pixel (i, j) turned clockwise about
 // the pivot lands on the centre of the target pixel that shows it. Shapes and
-// pivots that rotation never uses; half turns also in place.
+// pivots that rotation never uses, also turned in place.
 TEST(Raster, TurnsAboutAnIntegerPivot) {
     const struct {
         int32_t w, h, tw, th, px, py;
-    } shapes[] = {{4, 2, 4, 4, 2, 1}, {5, 3, 6, 6, 2, 2}, {3, 5, 5, 5, 1, 3}, {2, 2, 3, 3, 0, 0},
-                  {4, 3, 4, 3, 2, 1}, {8, 8, 8, 8, 4, 4}, {13, 9, 11, 14, 6, 5}, {6, 4, 6, 4, 5, 0}};
+    } shapes[] = {{4, 2, 4, 4, 2, 1}, {5, 3, 6, 6, 2, 2}, {3, 5, 5, 5, 1, 3},  {2, 2, 3, 3, 0, 0},
+                  {4, 3, 4, 3, 2, 1}, {8, 8, 8, 8, 4, 4}, {13, 9, 11, 14, 6, 5}, {6, 4, 6, 4, 5, 0},
+                  {5, 3, 3, 5, 2, 2}, {9, 13, 13, 9, 6, 5}, {6, 4, 4, 6, 5, 0},  {7, 2, 2, 7, -1, 3}};
     for (const auto& s : shapes) {
         // Opaque in the top half, translucent below: blocks of either kind and mixed ones.
         std::vector<uint32_t> values;
@@ -98,10 +99,14 @@ TEST(Raster, TurnsAboutAnIntegerPivot) {
             Pixels target(std::vector<uint32_t>(expected.size(), 0), s.tw);
             qk::platform::draw_turned(source.bitmap, turns, s.px, s.py, target.bitmap);
             EXPECT_EQ(target.values, expected);
-            if (turns == 2 && s.tw == s.w && s.th == s.h) {
+            // In place where the target has the shape the turn gives.
+            const bool odd = turns % 2 != 0;
+            if (std::make_pair(s.tw, s.th) == (odd ? std::make_pair(s.h, s.w) : std::make_pair(s.w, s.h))) {
                 Pixels in_place(values, s.w);
-                qk::platform::turn_half_in_place(in_place.bitmap, s.px, s.py);
+                ASSERT_TRUE(qk::platform::turn_in_place(in_place.bitmap, turns, s.px, s.py));
                 EXPECT_EQ(in_place.values, expected) << "in place";
+                EXPECT_EQ(in_place.bitmap.width(), s.tw);
+                EXPECT_EQ(in_place.bitmap.height(), s.th);
             }
         }
     }
