@@ -75,7 +75,8 @@ TEST(Raster, TurnsAboutAnIntegerPivot) {
         int32_t w, h, tw, th, px, py;
     } shapes[] = {{4, 2, 4, 4, 2, 1}, {5, 3, 6, 6, 2, 2}, {3, 5, 5, 5, 1, 3},  {2, 2, 3, 3, 0, 0},
                   {4, 3, 4, 3, 2, 1}, {8, 8, 8, 8, 4, 4}, {13, 9, 11, 14, 6, 5}, {6, 4, 6, 4, 5, 0},
-                  {5, 3, 3, 5, 2, 2}, {9, 13, 13, 9, 6, 5}, {6, 4, 4, 6, 5, 0},  {7, 2, 2, 7, -1, 3}};
+                  {5, 3, 3, 5, 2, 2}, {9, 13, 13, 9, 6, 5}, {6, 4, 4, 6, 5, 0},  {7, 2, 2, 7, -1, 3},
+                  {258, 301, 301, 258, 129, 150}};  // more than one tile of the quarter turn
     for (const auto& s : shapes) {
         // Opaque in the top half, translucent below: blocks of either kind and mixed ones.
         std::vector<uint32_t> values;
