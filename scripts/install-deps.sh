@@ -5,6 +5,10 @@ set -euo pipefail
 packages=(
   cmake ninja-build g++ pkg-config
   libgtest-dev libgmock-dev libbenchmark-dev
+  # picture codecs of the library and the JPEG codec module
+  libjpeg62-turbo-dev libturbojpeg0-dev libspng-dev libwebp-dev libgif-dev zlib1g-dev
+  # fuzzing (libFuzzer and the sanitizers' runtime)
+  clang libclang-rt-14-dev
 )
 
 missing=()

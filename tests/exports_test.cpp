@@ -33,6 +33,9 @@ const std::set<std::string> kDocumented = {
     // Conversion, csc_run(const QKImage*, QKImage*), geometry.
     "QKImage_convert", "QKImage_copyAndConvert", "_Z7csc_runPK7QKImagePS_", "QKImage_rotate", "QKImage_scale",
     "QKImage_crop", "QKImage_drawImage",
+    // Codecs and files, save_to_file(const char*, unsigned char*, unsigned int), fsize(FILE*).
+    "QKImage_encodeToJpeg", "QKImage_decodeFromJpeg", "QKImage_saveToFile", "QKImage_loadFromFile",
+    "_Z12save_to_filePKcPhj", "_Z5fsizeP8_IO_FILE",
 };
 
 // Names of the defined, globally visible entries of an ELF64 file's dynamic

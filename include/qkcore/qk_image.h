@@ -4,6 +4,7 @@
 #define QKCORE_QK_IMAGE_H
 
 #include <stdint.h>
+#include <stdio.h>
 #include <stdlib.h>
 
 #include "qk_common.h"
@@ -124,6 +125,38 @@ QK_API int32_t QKImage_crop(const QKImage* src, QKImage* dst, int32_t x, int32_t
 // packed RGB, or 4:2:0 with even offsets and sizes. Nothing is blended.
 QK_API int32_t QKImage_drawImage(const QKImage* src, QKImage* dst, int32_t x, int32_t y);
 
+// Codecs and files.
+
+// Compresses the image's pixels, in its own format, with the JPEG codec
+// module "libveljpeginterface.so" (loaded for this call). Quality 1..100 is
+// used as given, any other value as 85. Returns a new image of format JPEG
+// that owns the stream (its size is the stream's length), or null.
+QK_API QKImage* QKImage_encodeToJpeg(const QKImage* image, int32_t quality);
+// Decodes a picture held in memory into the image, in the image's format;
+// width and height become the picture's. JPEG data goes to the codec module
+// first (its buffer then replaces the image's), any picture the platform
+// decoder knows (JPEG, PNG, WebP, GIF) comes through RGBA otherwise. An image
+// without buffer gets one; an existing buffer too small for the picture is
+// refused with QK_ERROR_INVALID_SIZE before any pixel is written.
+QK_API int32_t QKImage_decodeFromJpeg(QKImage* image, const void* data, uint64_t size);
+// Saves the image to `path`; the path picks the kind: ".jpeg" or ".jpg"
+// anywhere in it (letter case ignored) gives a JPEG file, ".png" a PNG file,
+// anything else the raw bytes of the buffer. JPEG and raw files report file
+// errors only in the log (the status stays QK_OK).
+QK_API int32_t QKImage_saveToFile(const QKImage* image, const char* path, int32_t quality);
+// Loads a file into the image: decoded when it is a picture (as
+// QKImage_decodeFromJpeg), otherwise taken as raw pixels of the width,
+// height and format the image already has.
+QK_API int32_t QKImage_loadFromFile(QKImage* image, const char* path);
+
 }  // extern "C"
+
+// Writes `size` bytes to `path` (created, or cut to the new length), in as
+// many writes as the system needs; the outcome is only logged. Exported
+// under its C++ (type-mangled) name.
+QK_API void save_to_file(const char* path, unsigned char* data, unsigned int size);
+// The length of the open stream in bytes, or -1; the stream's position is
+// left where it was. Exported under its C++ (type-mangled) name.
+QK_API int64_t fsize(FILE* stream);
 
 #endif  // QKCORE_QK_IMAGE_H
