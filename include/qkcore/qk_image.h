@@ -84,7 +84,8 @@ QK_API void QKImage_reset(QKImage* image);
 QK_API void QKImage_destroy(QKImage* image);
 // An owned copy of the source's pixels (4:2:0 chroma kept at a separate
 // offset is gathered right behind the luma); null for a source without
-// buffer or size rule, or one whose recorded size is short of its picture.
+// buffer or size rule. A source that records fewer bytes than its picture
+// gives those bytes, and the rest of the clone is zero.
 QK_API QKImage* QKImage_clone(const QKImage* source);
 // The source's width, height and format, without buffer.
 QK_API QKImage* QKImage_cloneHeader(const QKImage* source);

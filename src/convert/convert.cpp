@@ -29,14 +29,16 @@ bool dimensions_fit(uint32_t format, int32_t width, int32_t height) {
 }
 
 // Same format: one block, or luma and chroma separately when the two images
-// keep their chroma in different places (or the block would miss it).
+// record different chroma offsets (0 and width x height name the same place,
+// but a block of the recorded size would then run past the picture) or the
+// block would miss the chroma.
 // memmove, because converting an image into itself is a harmless no-op.
 void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copyLength) {
     if (qk::is_yuv420_format(src.format)) {
         const uint64_t lumaBytes = static_cast<uint64_t>(src.width) * static_cast<uint64_t>(src.height);
         const uint64_t srcBase = qk::chroma_base(src);
         const uint64_t dstBase = qk::chroma_base(dst);
-        if (srcBase != dstBase || copyLength < dstBase + lumaBytes / 2) {
+        if (src.chromaOffset != dst.chromaOffset || copyLength < dstBase + lumaBytes / 2) {
             memmove(dst.data, src.data, lumaBytes);
             memmove(dst.data + dstBase, src.data + srcBase, lumaBytes / 2);
             return;

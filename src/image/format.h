@@ -68,9 +68,10 @@ inline ChromaStart chroma_start(const QKImage& image) {
 // height and format describe. A recorded size is checked against everything
 // the picture occupies, 4:2:0 chroma at a separate chromaOffset included;
 // without a recorded size the rule size is all there is to go by, and a
-// chromaOffset past the luma plane is the caller's promise. Images without a
-// size rule (a dimension below 1, encoded or unknown formats) pass: the
-// operations refuse them on their own terms.
+// chromaOffset past the luma plane is the caller's promise. A picture too
+// large for any byte count never fits. Images with nothing to read (a
+// dimension below 1, encoded or unknown formats) pass: the operations refuse
+// them on their own terms.
 bool buffer_holds_image(const QKImage& image);
 
 }  // namespace qk

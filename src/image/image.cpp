@@ -105,25 +105,23 @@ QKImage* QKImage_clone(const QKImage* source) {
     QKImage* clone = QKImage_createNew(source->width, source->height, source->format);
     if (clone == nullptr) return nullptr;
 
-    // The clone holds exactly one image of its format: bytes a source records
-    // beyond that are not copied, and a source that records fewer bytes than
-    // the copy must read is incomplete and is not cloned.
+    // The clone holds exactly one image of its format. Bytes a source records
+    // beyond that are not copied; a source that records fewer bytes gives
+    // what it has, never a byte read past them, and the rest of the clone is
+    // zero rather than whatever the allocator left there.
     const uint64_t available = source->size != 0 ? source->size : UINT64_MAX;
+    auto copy = [&](uint64_t to, uint64_t from, uint64_t length) {
+        const uint64_t present = from < available ? std::min(length, available - from) : 0;
+        if (present != 0) memcpy(clone->data + to, source->data + from, present);
+        memset(clone->data + to + present, 0, length - present);
+    };
     if (source->chromaOffset != 0 && qk::is_yuv420_format(source->format)) {
         const uint64_t luma = static_cast<uint64_t>(source->width) * static_cast<uint64_t>(source->height);
-        if (luma > available || uint64_t{source->chromaOffset} + luma / 2 > available) {
-            QKImage_destroy(clone);
-            return nullptr;
-        }
-        memcpy(clone->data, source->data, luma);
-        memcpy(clone->data + luma, source->data + source->chromaOffset, luma / 2);
+        copy(0, 0, luma);
+        copy(luma, source->chromaOffset, luma / 2);
         return clone;
     }
-    if (clone->size > available) {
-        QKImage_destroy(clone);
-        return nullptr;
-    }
-    memcpy(clone->data, source->data, clone->size);
+    copy(0, 0, clone->size);
     return clone;
 }
 

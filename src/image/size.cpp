@@ -33,7 +33,11 @@ uint64_t rule_size(uint64_t pixels, uint32_t format) {
 // byte counts, so a size that wrapped can never reach an allocation.
 uint64_t QKImage_requiredSize(int32_t width, int32_t height, uint32_t format) {
     if (width < 1 || height < 1) return 0;
-    uint64_t size = rule_size(static_cast<uint64_t>(width) * static_cast<uint64_t>(height), format);
+    const uint64_t pixels = static_cast<uint64_t>(width) * static_cast<uint64_t>(height);
+    // Every format takes at least a byte a pixel, so more pixels than that is
+    // out of range, and below it no rule can wrap (PCL's 16 x 2^62 would).
+    if (pixels > INT32_MAX) return 0;
+    const uint64_t size = rule_size(pixels, format);
     return size > INT32_MAX ? 0 : size;
 }
 
@@ -47,7 +51,13 @@ namespace qk {
 
 bool buffer_holds_image(const QKImage& image) {
     uint64_t needed = QKImage_requiredSize(image.width, image.height, image.format);
-    if (needed != 0 && image.size != 0 && image.chromaOffset != 0 && is_yuv420_format(image.format)) {
+    if (needed == 0) {
+        // Dimensions whose picture passes the largest byte count fit no
+        // buffer, whatever size it records. Without a size rule or with a
+        // dimension below 1 there is no picture to read.
+        return image.width < 1 || image.height < 1 || QKImage_requiredSize(1, 1, image.format) == 0;
+    }
+    if (image.size != 0 && image.size != 0 && image.chromaOffset != 0 && is_yuv420_format(image.format)) {
         needed = yuv420_extent(image.chromaOffset, image.width, image.height);
     }
     return QKImage_size(&image) >= needed;

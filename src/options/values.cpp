@@ -1,5 +1,6 @@
 // Value checks against option records, and readers of option strings.
 #include <limits.h>
+#include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
 
@@ -33,14 +34,9 @@ bool read_int(const char* text, int32_t* value) {
     return true;
 }
 
-// "%f" semantics.
-bool read_float(const char* text, float* value) {
-    char* end = nullptr;
-    const float read = strtof(text, &end);
-    if (end == text) return false;
-    *value = read;
-    return true;
-}
+// "%f" itself: strtof reads a longest valid prefix ("0" of "0x", "inf" of
+// "infin") where "%f" fails on the whole item it consumed.
+bool read_float(const char* text, float* value) { return sscanf(text, "%f", value) == 1; }
 
 bool in_range(int32_t value, int32_t min, int32_t max) {
     return (min == 0 && max == 0) || (min <= value && value <= max);

@@ -224,7 +224,9 @@ Rect draw_turn(const TurnMap& m, const SourceView& source, const TargetView& tar
                 for (; c + 4 <= c1; c += 4) {
                     turn_block<kBlend>(target.at(c, r), target.row_bytes, source_at(c, r), step_c, step_r);
                 }
-                for (int64_t i = 0; i < 4; ++i) {
+                // The tail's source address is formed only when there is a
+                // tail: past the last column it may lie outside the source.
+                for (int64_t i = 0; c < c1 && i < 4; ++i) {
                     put_run<kBlend>(target.at(c, r + i), source_at(c, r + i), step_c, c1 - c);
                 }
             }

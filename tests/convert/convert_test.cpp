@@ -103,6 +103,8 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
         {{D16, 16, 8, 300}, {D16, 16, 8, 300}, {{0, 0, 256}, {}}},
         {{PCL, 2, 2, 120}, {PCL, 2, 2, 120}, {{0, 0, 100}, {}}},
         {{NV12, 16, 8, 400, 400}, {NV12, 16, 8, 400, 400}, {{0, 0, 400}, {}}},  // equal recorded sizes
+        // Offsets 0 and 128 name one place, yet the recorded 400 bytes are not copied whole.
+        {{NV12, 16, 8, 400, 400}, {NV12, 16, 8, 400, 400, 128}, {{0, 0, 128}, {128, 128, 64}}},
         // YV12 with both chromas at 300: one block of the needed size would
         // stop short of the chroma.
         {{YV12, 16, 8, 364, 0, 300}, {YV12, 16, 8, 370, 370, 300}, {{0, 0, 128}, {300, 300, 64}}},

@@ -63,7 +63,9 @@ std::vector<Kernel> every_kernel() {
                 });
         }
         // Even widths only; one chroma pair whose pixels take the double path.
-        for (auto [lumaStep, chromaStep, rows] : {std::tuple{1, 1, 2}, {1, 2, 2}, {2, 4, 1}}) {
+        for (auto [lumaStepOf, chromaStepOf, rowsOf] : {std::tuple{1, 1, 2}, {1, 2, 2}, {2, 4, 1}}) {
+            // Structured bindings cannot be captured before C++20.
+            const int lumaStep = lumaStepOf, chromaStep = chromaStepOf, rows = rowsOf;
             const YuvToRgbShape shape{lumaStep, chromaStep, rows, rgb};
             add("YUV step " + std::to_string(chromaStep) + " to " + from,
                 [=](int w) { return size_t(w / 2) * 4 * rgb.bytesPerPixel; },

@@ -33,10 +33,13 @@ TEST(Rotate, EveryAngleMapsEveryPixel) {
     const struct {
         int32_t angle;
         int orient;
-    } angles[] = {{0, 0}, {90, 1}, {180, 2}, {270, 3}, {-90, 3}, {-180, 2}, {-270, 1}, {-360, 0}, {450, 1}, {900, 2}};
+    } angles[] = {{0, 0},   {90, 1},  {180, 2}, {270, 3}, {-90, 3}, {-180, 2},
+                  {-270, 1}, {-360, 0}, {450, 1}, {900, 2}, {-810, 3}};
+    // Column counts that are multiples of 4 leave a quarter turn's tiles an
+    // empty tail (8x4, 7x4 and 10x16 turned by 270).
     const struct {
         int32_t w, h;
-    } sizes[] = {{4, 2}, {8, 4}, {5, 3}, {3, 5}, {7, 9}, {1, 1}, {1, 4}, {5, 1}};
+    } sizes[] = {{4, 2}, {8, 4}, {7, 4}, {10, 16}, {5, 3}, {3, 5}, {7, 9}, {1, 1}, {1, 4}, {5, 1}};
     for (const auto& size : sizes) {
         for (const auto& a : angles) {
             SCOPED_TRACE(::testing::Message() << size.w << "x" << size.h << " by " << a.angle);

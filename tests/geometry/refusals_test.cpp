@@ -98,6 +98,7 @@ TEST(GeometryRefusals, ReportOnceAndLeaveTheImagesAlone) {
         {kCrop, "preset size too small", rgba4, {RGBA, 2, 2, 15, kNone}, 0, 0, SIZE},
         {kCrop, "destination with buffer, width 0", rgba4, {RGBA, 0, 2, 60}, 0, 0, SIZE},
         {kCrop, "chroma past the recorded size", {NV21, 4, 4}, {NV21, 4, 4, 24, kBuffer, 20}, 0, 0, SIZE},
+        {kCrop, "source past the byte range", {RGBA, 100000, 100000, 16}, none2, 0, 1, SIZE},
         {kCrop, "destination buffer not obtained", rgba2, {RGBA, 0, 0, 0, kNone}, 0, 0, PARAM, kImageFile},
         // Format and parity refusals come after the destination got its buffer.
         {kCrop, "GREY", {GREY, 4, 4}, {GREY, 2, 2, 0, kNone}, 0, 0, NONE, nullptr, nullptr, true},
@@ -112,6 +113,8 @@ TEST(GeometryRefusals, ReportOnceAndLeaveTheImagesAlone) {
         {kDraw, "destination without buffer", rgba2, {RGBA, 4, 4, 0, kNone}, 0, 0, NUL},
         {kDraw, "source size 0", {RGBA, 0, 2}, rgba4, 0, 0, SIZE},
         {kDraw, "destination size below its picture", rgba2, {RGBA, 4, 4, 60}, 0, 0, SIZE},
+        {kDraw, "source past the byte range", {RGBA, 100000, 100000, 16}, rgba4, 0, 0, SIZE},
+        {kDraw, "destination past the byte range", rgba2, {RGBA, 100000, 100000, 16}, 0, 0, SIZE},
         {kDraw, "formats differ", rgba2, {QK_FORMAT_ABGR, 4, 4}, 0, 0, PARAM},
         {kDraw, "4:2:0 x odd", {NV12, 2, 2}, {NV12, 4, 4}, 1, 0, NONE, nullptr,
          "Unsupported dimensions for YUV420: 2x2 offset 1,0"},

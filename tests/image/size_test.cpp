@@ -25,6 +25,7 @@ TEST(SizeRule, BytesPerFormat) {
         {65536, 65536, QK_FORMAT_RGBA, 0},  // 4 x 2^32 wraps to 0
         {32768, 16384, QK_FORMAT_RGBA, 0},  // exactly 2^31
         {INT32_MAX, INT32_MAX, QK_FORMAT_PCL, 0}, {INT32_MAX, 1, QK_FORMAT_NV12, 0},
+        {1 << 30, 1 << 30, QK_FORMAT_PCL, 0},  // 16 x 2^60 + 36 wraps to 36 in 64 bits
         {INT32_MAX, 1, QK_FORMAT_GREY, INT32_MAX}, {8192, 8191, QK_FORMAT_RGBA, 268402688},
     };
     for (const Case& c : cases) {

@@ -184,6 +184,8 @@ TEST(OptionStrings, ReadsTheNamedItemOrGivesTheDefault) {
         {"iso=100,", "iso", 100, 100.0f},  // trailing comma
         {"iso", "iso", kNoInt, kNoFloat},  // no "="
         {"iso=auto", "iso", kNoInt, kNoFloat},
+        {"ev=0x", "ev", 0, kNoFloat}, {"ev=infin", "ev", kNoInt, kNoFloat},  // "%f" fails where strtof reads a prefix
+        {"ev=0x1p1", "ev", 0, 2.0f}, {"ev=-infinity", "ev", kNoInt, -INFINITY},
         {"iso=-2147483648", "iso", INT32_MIN, -2147483648.0f},
         {"iso=2147483648", "iso", kNoInt, 2147483648.0f},  // out of the 32-bit range
         // Unusable arguments; names cannot hold the separators.
