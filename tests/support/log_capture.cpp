@@ -55,9 +55,10 @@ bool digits_from(const std::string& text, size_t at) {
 
 // A failure report is a level-4 line "NAME (VALUE): FILE:LINE".
 ::testing::AssertionResult HasOneFailureReport(const LogCapture& log, int32_t status, const char* file) {
-    static const std::map<int32_t, std::string> names = {{-2, "NULL_PARAM"},   {-3, "INVALID_PARAM"},
-                                                         {-4, "INVALID_SIZE"}, {-5, "ALLOC_FAILED"},
-                                                         {-6, "UNSUPPORTED"},  {-42, "NOT_IMPLEMENTED"}};
+    static const std::map<int32_t, std::string> names = {
+        {-1, "UNKNOWN"},      {-2, "NULL_PARAM"},  {-3, "INVALID_PARAM"}, {-4, "INVALID_SIZE"},
+        {-5, "ALLOC_FAILED"}, {-6, "UNSUPPORTED"}, {-8, "IO_FAILED"},     {-9, "CODEC_FAILED"},
+        {-42, "NOT_IMPLEMENTED"}};
     const std::string wanted = "QK_ERROR_" + names.at(status) + " (" + std::to_string(status) + "): " + file + ":";
     int reports = 0, matching = 0;
     for (const std::string& text : log.texts(4)) {
