@@ -2,21 +2,45 @@
 
 #include <errno.h>
 #include <stdlib.h>
+#include <string.h>
 #include <strings.h>
 
 #include "qkcore/qk_image.h"
 
+bool g_verbose = false;
+
 const FormatName kFormats[] = {
-    {"RGBA", QK_FORMAT_RGBA}, {"BGRA", QK_FORMAT_BGRA}, {"ARGB", QK_FORMAT_ARGB}, {"ABGR", QK_FORMAT_ABGR},
-    {"RGB8", QK_FORMAT_RGB8}, {"BGR8", QK_FORMAT_BGR8}, {"GREY", QK_FORMAT_GREY}, {"YUYV", QK_FORMAT_YUYV},
-    {"YVYU", QK_FORMAT_YVYU}, {"NV12", QK_FORMAT_NV12}, {"NV21", QK_FORMAT_NV21}, {"YV12", QK_FORMAT_YV12},
-    {"YUVP", QK_FORMAT_YUVP}, {"D16", QK_FORMAT_D16},   {"PCL", QK_FORMAT_PCL},   {"JPEG", QK_FORMAT_JPEG},
+    {"YUVP", QK_FORMAT_YUVP, "yuv420p,I420", "4:2:0: Y plane, U plane, V plane"},
+    {"YV12", QK_FORMAT_YV12, "yvu420p", "4:2:0: Y plane, V plane, U plane"},
+    {"NV12", QK_FORMAT_NV12, "", "4:2:0: Y plane, then U V pairs"},
+    {"NV21", QK_FORMAT_NV21, "", "4:2:0: Y plane, then V U pairs (camera frames)"},
+    {"YUYV", QK_FORMAT_YUYV, "yuyv422,YUY2", "4:2:2 packed: Y0 U Y1 V"},
+    {"YVYU", QK_FORMAT_YVYU, "yvyu422", "4:2:2 packed: Y0 V Y1 U"},
+    {"GREY", QK_FORMAT_GREY, "gray,y8", "luma only, a byte a pixel"},
+    {"RGB8", QK_FORMAT_RGB8, "rgb24", "R G B, 3 bytes a pixel"},
+    {"BGR8", QK_FORMAT_BGR8, "bgr24", "B G R, 3 bytes a pixel"},
+    {"RGBA", QK_FORMAT_RGBA, "", "R G B A, 4 bytes a pixel"},
+    {"BGRA", QK_FORMAT_BGRA, "", "B G R A"},
+    {"ARGB", QK_FORMAT_ARGB, "", "A R G B"},
+    {"ABGR", QK_FORMAT_ABGR, "", "A B G R"},
+    {"D16", QK_FORMAT_D16, "", "16-bit depth samples (copied only)"},
+    {"PCL", QK_FORMAT_PCL, "", "point cloud: 36-byte header + 16 bytes a point (copied only)"},
+    {"JPEG", QK_FORMAT_JPEG, "", "an encoded stream, not a raw frame"},
 };
 const int kFormatCount = sizeof(kFormats) / sizeof(kFormats[0]);
 
 bool parse_format(const char* text, uint32_t* code) {
+    const size_t length = strlen(text);
     for (const FormatName& format : kFormats) {
-        if (strcasecmp(text, format.name) == 0) {
+        bool found = strcasecmp(text, format.name) == 0;
+        // Each alias is a comma-terminated (or final) word of the list.
+        for (const char* alias = format.aliases; !found && *alias != '\0';) {
+            const char* comma = strchr(alias, ',');
+            const size_t alias_length = comma != nullptr ? size_t(comma - alias) : strlen(alias);
+            found = alias_length == length && strncasecmp(text, alias, length) == 0;
+            alias += alias_length + (comma != nullptr ? 1 : 0);
+        }
+        if (found) {
             *code = format.code;
             return true;
         }
@@ -31,21 +55,32 @@ std::string format_name(uint32_t code) {
     return "????";
 }
 
-namespace {
-
-bool parse_dimension(const char* text, char** end, int32_t* value) {
-    if (*text < '0' || *text > '9') return false;
+bool parse_number(const char* text, const char** end, int64_t min, int64_t max, int32_t* value) {
+    const bool sign = *text == '-' || *text == '+';
+    if (sign && min >= 0) return false;
+    if (text[sign ? 1 : 0] < '0' || text[sign ? 1 : 0] > '9') return false;
     errno = 0;
-    long parsed = strtol(text, end, 10);
-    if (errno != 0 || parsed < 1 || parsed > INT32_MAX) return false;
+    char* stop = nullptr;
+    const long long parsed = strtoll(text, &stop, 10);
+    if (errno != 0 || parsed < min || parsed > max) return false;
+    *end = stop;
     *value = static_cast<int32_t>(parsed);
     return true;
 }
 
-}  // namespace
+bool parse_int(const char* text, int32_t* value) {
+    const char* end = nullptr;
+    return parse_number(text, &end, INT32_MIN, INT32_MAX, value) && *end == '\0';
+}
 
 bool parse_size(const char* text, int32_t* width, int32_t* height) {
-    char* end = nullptr;
-    if (!parse_dimension(text, &end, width) || (*end != 'x' && *end != 'X')) return false;
-    return parse_dimension(end + 1, &end, height) && *end == '\0';
+    const char* end = nullptr;
+    if (!parse_number(text, &end, 1, INT32_MAX, width) || (*end != 'x' && *end != 'X')) return false;
+    return parse_number(end + 1, &end, 1, INT32_MAX, height) && *end == '\0';
+}
+
+bool parse_point(const char* text, int32_t* x, int32_t* y) {
+    const char* end = nullptr;
+    if (!parse_number(text, &end, INT32_MIN, INT32_MAX, x) || *end != ',') return false;
+    return parse_number(end + 1, &end, INT32_MIN, INT32_MAX, y) && *end == '\0';
 }

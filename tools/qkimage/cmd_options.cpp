@@ -7,14 +7,14 @@
 // with the caller's default when it reads nothing, so two different defaults
 // tell "no value" apart from a value that equals one of them.
 int cmd_options(int argc, char** argv) {
-    if (argc < 2) {
-        fprintf(stderr, "usage: qkimage options OPTION_STRING NAME...\n");
-        return 2;
-    }
-    const char* options = argv[0];
+    Options args;
+    const int status = parse_options("options", argc, argv, {}, &args);
+    if (status >= 0) return status;
+    if (args.paths.size() < 2) return usage_error("options", "want an option string and at least one name");
+    const char* options = args.paths[0].c_str();
     int missing = 0;
-    for (int i = 1; i < argc; ++i) {
-        const char* name = argv[i];
+    for (size_t i = 1; i < args.paths.size(); ++i) {
+        const char* name = args.paths[i].c_str();
         const int32_t integer = QKOption_ParseStringI(options, name, 0);
         const bool has_integer = integer != 0 || QKOption_ParseStringI(options, name, 1) != 1;
         const float real = QKOption_ParseStringF(options, name, 0.0f);

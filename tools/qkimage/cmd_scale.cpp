@@ -4,15 +4,25 @@
 #include "qkcore/qk_image.h"
 
 int cmd_scale(int argc, char** argv) {
-    const FrameCommand command{"scale", "--size WxH --format RGBA --to WxH IN OUT", {"--to"}};
-    FrameArgs args;
-    if (!parse_frame_args(command, argc, argv, &args)) return 2;
-    int32_t width = 0, height = 0;
-    if (!parse_size(args.options["--to"].c_str(), &width, &height)) {
-        return usage_error(command, "bad --to '" + args.options["--to"] + "' (want WIDTHxHEIGHT)");
+    const char* kName = "scale";
+    Options options;
+    const int status = parse_options(kName, argc, argv, {"--size", "--format", "--to"}, &options);
+    if (status >= 0) return status;
+    int32_t width = 0, height = 0, to_width = 0, to_height = 0;
+    uint32_t format = 0;
+    if (!frame_input(kName, options, "--format", &width, &height, &format) ||
+        !size_option(kName, options, "--to", &to_width, &to_height) ||
+        !check_frame(kName, to_width, to_height, format)) {
+        return 2;
     }
-    ImageHandle source = read_frame(command, args.input, args.width, args.height, args.format);
+    if (format != QK_FORMAT_RGBA) {
+        return usage_error(kName, "scale works on RGBA frames only, not " + format_name(format) + " (convert first)");
+    }
+    ImageHandle source = read_frame(kName, options.paths[0], width, height, format);
     if (!source) return 1;
-    ImageHandle target = hold(QKImage_createEmpty(width, height, args.format));
-    return finish(command, QKImage_scale(source.get(), target.get()), args.output, target.get());
+    ImageHandle target = hold(QKImage_createEmpty(to_width, to_height, format));
+    if (!target || QKImage_scale(source.get(), target.get()) != QK_OK) {
+        return operation_failed(kName, "could not scale the frame to " + describe(to_width, to_height, format));
+    }
+    return write_frame(kName, options.paths[1], *target) ? 0 : 1;
 }

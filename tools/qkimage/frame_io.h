@@ -1,61 +1,96 @@
-// Raw frame files and the arguments shared by the subcommands that transform
-// them: "--size WxH --format FMT", the operation's own options, then the input
-// and output paths. A raw frame is an image's pixel bytes without header,
-// exactly the format's size at that width and height.
+// Raw frames, pictures and output files. A raw frame is an image's pixel
+// bytes without header, exactly the format's size at that width and height.
+// "-" names standard input or output. Outputs appear only when complete.
 #ifndef QKIMAGE_FRAME_IO_H
 #define QKIMAGE_FRAME_IO_H
 
 #include <stdint.h>
 
-#include <map>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "args.h"
 #include "qkcore/qk_image.h"
-
-struct FrameCommand {
-    const char* name;   // "rotate"
-    const char* usage;  // the arguments after the name
-    std::vector<std::string> options;  // the operation's own options, e.g. "--angle"
-    const char* format_option = "--format";  // names the input frame's format
-};
-
-struct FrameArgs {
-    int32_t width = 0;
-    int32_t height = 0;
-    uint32_t format = 0;
-    std::map<std::string, std::string> options;  // every option given, by name
-    std::string input;
-    std::string output;
-};
-
-// Parses --size, the format option, the command's options (each required) and the two
-// paths. On a bad argument prints a message and the usage to stderr and
-// returns false.
-bool parse_frame_args(const FrameCommand& command, int argc, char** argv, FrameArgs* args);
-// Prints "qkimage NAME: message" and the usage; returns the exit status 2.
-int usage_error(const FrameCommand& command, const std::string& message);
 
 // An image released with QKImage_destroy when it goes out of scope.
 using ImageHandle = std::unique_ptr<QKImage, decltype(&QKImage_destroy)>;
 inline ImageHandle hold(QKImage* image) { return ImageHandle(image, &QKImage_destroy); }
 
-// Reads a raw frame of the given size and format into a new image, or prints
-// why it could not and returns null.
-ImageHandle read_frame(const FrameCommand& command, const std::string& path, int32_t width, int32_t height,
+// The six RGB formats (packed, 3 or 4 bytes a pixel).
+bool is_rgb(uint32_t format);
+// 4:2:0 formats need an even width and height, packed 4:2:2 an even width.
+bool needs_even_width(uint32_t format);
+bool needs_even_height(uint32_t format);
+// Why a raw frame of these dimensions and format cannot exist, in words the
+// user understands ("NV21 needs an even width and height"), or "" when it can.
+std::string frame_problem(int32_t width, int32_t height, uint32_t format);
+// frame_problem as a usage error; false when there is one.
+bool check_frame(const char* command, int32_t width, int32_t height, uint32_t format);
+// "1920x1080 NV21".
+std::string describe(int32_t width, int32_t height, uint32_t format);
+
+// The input frame of a frame command: --size, the format option (usually
+// --format), a frame that can exist, and IN OUT. False after a usage error.
+bool frame_input(const char* command, const Options& options, const char* format_name, int32_t* width,
+                 int32_t* height, uint32_t* format);
+
+// Reads a raw frame of the given size and format (checked with frame_problem
+// first) into a new image, or prints why it could not and returns null.
+ImageHandle read_frame(const char* command, const std::string& path, int32_t width, int32_t height,
                        uint32_t format);
-// Writes the image's pixels (its format's size at its width and height).
-bool write_frame(const FrameCommand& command, const std::string& path, const QKImage& image);
+// The whole file (or standard input) in memory; false after a message.
+bool read_input(const char* command, const std::string& path, std::vector<uint8_t>* bytes);
 
-// The exit status of a command whose operation returned `status`: 0 once the
-// result is written to `path`; 1, with a message, when the operation failed
-// or the file could not be written.
-int finish(const FrameCommand& command, int32_t status, const std::string& path, const QKImage* result);
+// A file that appears only when complete: written under a temporary name
+// beside the target and renamed over it by commit(). Until then the target,
+// if it exists, is untouched; the temporary is removed when the object goes
+// away uncommitted, and on SIGINT, SIGTERM or SIGHUP. "-" writes standard
+// output directly. One is open at a time.
+class OutputFile {
+public:
+    OutputFile() = default;
+    OutputFile(const OutputFile&) = delete;
+    OutputFile& operator=(const OutputFile&) = delete;
+    ~OutputFile();
 
-// "X,Y" with any signed 32-bit values.
-bool parse_point(const char* text, int32_t* x, int32_t* y);
-// A signed 32-bit decimal number and nothing else.
-bool parse_int(const char* text, int32_t* value);
+    // Creates the temporary; `suffix` ends its name (so the library's file
+    // rule sees the same kind). False after a message.
+    bool open(const char* command, const std::string& path, const char* suffix = "");
+    bool write(const void* data, uint64_t size);
+    // The temporary's name, for writers that take a path; empty for "-".
+    const std::string& temp_path() const { return temp_; }
+    // Bytes in the temporary now (after a writer that took its path).
+    uint64_t temp_size() const;
+    // Closes and renames the temporary over the target; false after a message.
+    bool commit();
+
+private:
+    void discard();
+
+    const char* command_ = "";
+    std::string path_;
+    std::string temp_;
+    int fd_ = -1;
+};
+
+// Writes bytes, or an image's raw frame, to an OutputFile; false after a message.
+bool write_output(const char* command, const std::string& path, const void* data, uint64_t size);
+bool write_frame(const char* command, const std::string& path, const QKImage& image);
+
+// Saves with the library's QKImage_saveToFile into a temporary whose name
+// ends in `suffix` (so its path rule picks the same kind), checks that the
+// file holds `expected` bytes (any number above 0 when `expected` is 0) and
+// renames it over `path`. False after a message.
+bool save_through_library(const char* command, const QKImage& image, const std::string& path, const char* suffix,
+                          int32_t quality, uint64_t expected);
+
+// Decodes a picture into a new image of `format` with `decode`, which fills
+// the image without buffer it is given (the library's decoder or file
+// loader) and returns a status. A picture of odd size that the format cannot
+// hold is decoded to RGBA, cut to even with a warning, and converted.
+// Returns null on failure, for the caller to say what it was decoding.
+ImageHandle decode_picture(const char* command, uint32_t format, const std::function<int32_t(QKImage*)>& decode);
 
 #endif  // QKIMAGE_FRAME_IO_H

@@ -1,56 +1,59 @@
-// qkimage: inspect and transform raw image frames with the qkcore library.
+// qkimage: raw camera frames and pictures through the qkcore library.
 #include <stdarg.h>
 #include <stdio.h>
 #include <string.h>
 
+#include "args.h"
 #include "commands.h"
 #include "qkcore/qk_log.h"
 
 namespace {
 
-// The library's warnings and errors go to standard error; its progress lines
-// are not for the tool's user.
-int log_problems(int level, ...) {
-    if (level < QK_LOG_WARN || level > QK_LOG_ERROR) return 0;
+// The library writes every message to standard output by default, which
+// would mix with frames written to "-". Its messages (failure reports
+// naming source lines included) are for whoever asks with --verbose; by
+// default each command says what failed in its own words.
+int log_to_stderr_when_verbose(int level, ...) {
+    if (!g_verbose) return 0;
+    static const char* const kTags[] = {"V", "D", "I", "W", "E"};
     va_list args;
     va_start(args, level);
     const char* format = va_arg(args, const char*);
-    fputs("qkimage: ", stderr);
+    fprintf(stderr, "qkimage: library [%s] ", level >= 0 && level <= 4 ? kTags[level] : "V");
     vfprintf(stderr, format, args);
     fputc('\n', stderr);
     va_end(args);
     return 0;
 }
 
-struct Command {
-    const char* name;
-    int (*run)(int argc, char** argv);
-    const char* usage;
-};
-
-const Command kCommands[] = {
-    {"formats", cmd_formats, "formats WIDTHxHEIGHT\n      byte size of every format at that size"},
-    {"convert", cmd_convert, "convert --size WxH --from FORMAT --to FORMAT IN OUT\n      convert a raw frame to another pixel format"},
-    {"rotate", cmd_rotate, "rotate --size WxH --format FORMAT --angle DEGREES IN OUT\n      turn a raw frame by a multiple of 90 degrees"},
-    {"scale", cmd_scale, "scale --size WxH --format RGBA --to WxH IN OUT\n      resample a raw RGBA frame (nearest pixel)"},
-    {"crop", cmd_crop, "crop --size WxH --format FORMAT --at X,Y --to WxH IN OUT\n      cut a rectangle out of a raw frame"},
-    {"options", cmd_options, "options OPTION_STRING NAME...\n      the named items' values, as the option readers read them"},
-};
-
-int usage() {
-    fprintf(stderr, "usage: qkimage COMMAND [ARGS...]\ncommands:\n");
-    for (const Command& command : kCommands) fprintf(stderr, "  %s\n", command.usage);
-    return 2;
-}
-
 }  // namespace
 
 int main(int argc, char** argv) {
-    if (argc < 2) return usage();
-    HX_LogMsg = log_problems;
-    for (const Command& command : kCommands) {
-        if (strcmp(argv[1], command.name) == 0) return command.run(argc - 2, argv + 2);
+    HX_LogMsg = log_to_stderr_when_verbose;
+    int first = 1;
+    for (; first < argc && strcmp(argv[first], "--verbose") == 0; ++first) g_verbose = true;
+    if (first == argc) {
+        fprintf(stderr, "qkimage: which command? (qkimage --help lists them)\n");
+        return 2;
     }
-    fprintf(stderr, "qkimage: unknown command '%s'\n", argv[1]);
-    return usage();
+    const char* name = argv[first];
+    if (strcmp(name, "--help") == 0 || strcmp(name, "-h") == 0 || strcmp(name, "help") == 0) {
+        const Command* command = first + 1 < argc ? find_command(argv[first + 1]) : nullptr;
+        if (command != nullptr) {
+            print_usage(*command, stdout);
+        } else {
+            print_help(stdout);
+        }
+        return 0;
+    }
+    if (strcmp(name, "--version") == 0) {
+        printf("qkimage %s\n", QKIMAGE_VERSION);
+        return 0;
+    }
+    const Command* command = find_command(name);
+    if (command == nullptr) {
+        fprintf(stderr, "qkimage: unknown command '%s' (qkimage --help lists them)\n", name);
+        return 2;
+    }
+    return command->run(argc - first - 1, argv + first + 1);
 }
