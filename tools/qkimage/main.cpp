@@ -39,6 +39,10 @@ int main(int argc, char** argv) {
     const char* name = argv[first];
     if (strcmp(name, "--help") == 0 || strcmp(name, "-h") == 0 || strcmp(name, "help") == 0) {
         const Command* command = first + 1 < argc ? find_command(argv[first + 1]) : nullptr;
+        if (command == nullptr && first + 1 < argc) {
+            fprintf(stderr, "qkimage: no command '%s' (qkimage --help lists them)\n", argv[first + 1]);
+            return 2;
+        }
         if (command != nullptr) {
             print_usage(*command, stdout);
         } else {
