@@ -60,8 +60,8 @@ cmp -s frame.rgba piped.rgba || fail "--name=value with - - gave other bytes"
 size_is back.nv21 115200
 [ "$(cat size.txt)" = "320x240 NV21" ] || fail "decode printed '$(cat size.txt)'"
 [ "$("$tool" decode --format RGBA demo/picture.jpg - 2>&1 >/dev/null)" = "320x240 RGBA" ] || fail "decode size line"
-"$tool" save --size 320x240 --format RGBA frame.rgba frame.png
-"$tool" load --format RGBA frame.png loaded.rgba >/dev/null
+"$tool" save --size 320x240 --format RGBA frame.rgba jpg.png  # the temporary file must not say ".jpg"
+"$tool" load --format RGBA jpg.png loaded.rgba >/dev/null
 cmp -s frame.rgba loaded.rgba || fail "PNG save and load changed the pixels"
 "$tool" save --size 320x240 --format RGBA frame.rgba frame.raw
 "$tool" load --size 320x240 --format RGBA - reloaded.rgba <frame.raw >/dev/null

@@ -146,11 +146,14 @@ bool OutputFile::open(const char* command, const std::string& path, const char* 
     if (exists && S_ISDIR(target.st_mode)) return failure(command, "'" + path + "' is a directory"), false;
     const size_t slash = path.rfind('/');
     std::string base = path.substr(slash == std::string::npos ? 0 : slash + 1);
-    // Without dots, only `suffix` can carry a ".png"-like marker in the name.
+    // The library's path rule looks for ".jpg" and the like anywhere: the
+    // name's only dots are the leading one, followed by a fixed word, and
+    // those of `suffix` (so "jpg.png" cannot become ".jpg_png", nor random
+    // letters after a dot ".jpgQ3x").
     std::replace(base.begin(), base.end(), '.', '_');
     base.resize(std::min<size_t>(base.size(), 64));
     const std::string dir = slash == std::string::npos ? "" : path.substr(0, slash + 1);
-    const std::string temp = dir + "." + base + ".XXXXXX" + suffix;
+    const std::string temp = dir + ".qkimage-" + base + "-XXXXXX" + suffix;
     if (temp.size() >= sizeof(g_temp)) return failure(command, "the path '" + path + "' is too long"), false;
 
     install_handlers();
