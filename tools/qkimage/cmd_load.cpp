@@ -70,7 +70,7 @@ int cmd_load(int argc, char** argv) {
     if (fd >= 0) close(fd);
     if (!image) {
         return operation_failed(kName, "could not load " + shown + (width != 0 ? "" :
-                                           " as a JPEG, PNG, WebP or GIF picture (give --size to read raw pixels)"));
+                                           " as a JPEG, PNG, WebP or GIF picture; for raw pixels give --size"));
     }
     if (!write_frame(kName, options.paths[1], *image)) return 1;
     fprintf(options.paths[1] == "-" ? stderr : stdout, "%s\n", describe(image->width, image->height, format).c_str());

@@ -86,10 +86,10 @@ bool check_frame(const char* command, int32_t width, int32_t height, uint32_t fo
     return problem.empty() || usage_error(command, problem) == 0;
 }
 
-bool frame_input(const char* command, const Options& options, const char* format_name, int32_t* width,
+bool frame_input(const char* command, const Options& options, const char* format_flag, int32_t* width,
                  int32_t* height, uint32_t* format) {
     return size_option(command, options, "--size", width, height) &&
-           format_option(command, options, format_name, format) && check_frame(command, *width, *height, *format) &&
+           format_option(command, options, format_flag, format) && check_frame(command, *width, *height, *format) &&
            path_count(command, options, 2);
 }
 

@@ -33,7 +33,7 @@ std::string describe(int32_t width, int32_t height, uint32_t format);
 
 // The input frame of a frame command: --size, the format option (usually
 // --format), a frame that can exist, and IN OUT. False after a usage error.
-bool frame_input(const char* command, const Options& options, const char* format_name, int32_t* width,
+bool frame_input(const char* command, const Options& options, const char* format_flag, int32_t* width,
                  int32_t* height, uint32_t* format);
 
 // Reads a raw frame of the given size and format (checked with frame_problem

@@ -33,7 +33,7 @@ int main(int argc, char** argv) {
     int first = 1;
     for (; first < argc && strcmp(argv[first], "--verbose") == 0; ++first) g_verbose = true;
     if (first == argc) {
-        fprintf(stderr, "qkimage: which command? (qkimage --help lists them)\n");
+        fprintf(stderr, "usage: qkimage [--verbose] COMMAND [ARGS...]   (qkimage --help lists the commands)\n");
         return 2;
     }
     const char* name = argv[first];
