@@ -17,6 +17,9 @@ namespace qk::platform {
 // it does not recognise, a damaged or truncated picture, or a picture whose
 // RGBA pixels would take more than max_picture_bytes(): that is decided from
 // the header, before any pixel memory is taken. Never writes to stderr.
+// A GIF's first frame is placed on its logical screen, which is transparent
+// black wherever the frame shows nothing; animated WebP and CMYK JPEG
+// pictures are refused.
 bool decode_picture(const uint8_t* data, size_t size, Bitmap& bitmap);
 
 // Writes the bitmap's RGBA bytes as they are (no premultiplication round
