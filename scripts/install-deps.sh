@@ -7,6 +7,8 @@ packages=(
   libgtest-dev libgmock-dev libbenchmark-dev
   # picture codecs of the library and the JPEG codec module
   libjpeg62-turbo-dev libturbojpeg0-dev libspng-dev libwebp-dev libgif-dev zlib1g-dev
+  # the PNG yardstick of the benchmarks
+  libpng-dev
   # fuzzing (libFuzzer and the sanitizers' runtime)
   clang libclang-rt-14-dev
 )
