@@ -28,7 +28,7 @@ bool row_carries_chroma(const YuvLayout& layout, ptrdiff_t y) {
 void convert_rgb_to_rgb(const QKImage& src, QKImage& dst) {
     const int s = rgb_format_index(src.format);
     const int d = rgb_format_index(dst.format);
-    const RgbToRgbShape shape{kRgbLayouts[s], kRgbLayouts[d]};
+    const RgbToRgbShape shape{kFormats[s].rgb, kFormats[d].rgb};
     const RgbToRgbRow row = select_rgb_to_rgb_row(s, d);
     const ptrdiff_t width = src.width;
     for (ptrdiff_t y = 0; y < src.height; ++y) {
@@ -40,7 +40,7 @@ void convert_rgb_to_rgb(const QKImage& src, QKImage& dst) {
 void convert_rgb_to_yuv(const QKImage& src, QKImage& dst) {
     const int s = rgb_format_index(src.format);
     const YuvLayout out = yuv_layout(dst);
-    const RgbToYuvShape shape{kRgbLayouts[s], out.lumaStep, out.chromaStep};
+    const RgbToYuvShape shape{kFormats[s].rgb, out.lumaStep, out.chromaStep};
     const RgbToLumaRow luma = select_rgb_to_luma_row(s, out.lumaStep);
     const RgbToChromaRow chroma = select_rgb_to_chroma_row(s, out.chromaStep);
     const ptrdiff_t width = src.width;
@@ -57,7 +57,7 @@ void convert_rgb_to_yuv(const QKImage& src, QKImage& dst) {
 void convert_yuv_to_rgb(const QKImage& src, QKImage& dst) {
     const YuvLayout in = yuv_layout(src);
     const int d = rgb_format_index(dst.format);
-    const RgbLayout& out = kRgbLayouts[d];
+    const RgbLayout& out = kFormats[d].rgb;
     const ptrdiff_t width = src.width;
     const ptrdiff_t rowBytes = width * out.bytesPerPixel;
     if (in.chromaStep == 0) {

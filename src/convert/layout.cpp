@@ -4,13 +4,6 @@
 
 namespace qk {
 
-int rgb_format_index(uint32_t format) {
-    for (int i = 0; i < kRgbFormatCount; ++i) {
-        if (kRgbFormats[i] == format) return i;
-    }
-    return -1;
-}
-
 YuvLayout yuv_layout(const QKImage& image) {
     switch (image.format) {
         case QK_FORMAT_NV12:

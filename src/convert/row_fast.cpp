@@ -19,7 +19,7 @@ namespace {
 
 template <int S, int D>
 void rgb_to_rgb_bytes(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape&) {
-    rgb_to_rgb_loop(src, dst, width, kRgbLayouts[S], kRgbLayouts[D]);
+    rgb_to_rgb_loop(src, dst, width, kFormats[S].rgb, kFormats[D].rgb);
 }
 
 static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__, "the word kernels below number bytes from the low end");
@@ -32,8 +32,8 @@ constexpr uint32_t byte_at(uint32_t word, int offset) { return (word >> (8 * off
 // for the reference kernel.
 template <int S, int D>
 void rgb3_to_rgb4_words(const uint8_t* src, uint8_t* dst, ptrdiff_t count) {
-    constexpr RgbLayout s = kRgbLayouts[S];
-    constexpr RgbLayout d = kRgbLayouts[D];
+    constexpr RgbLayout s = kFormats[S].rgb;
+    constexpr RgbLayout d = kFormats[D].rgb;
     for (ptrdiff_t i = 0; i < count; ++i) {
         uint32_t in;
         memcpy(&in, src + 3 * i, sizeof(in));
@@ -52,7 +52,7 @@ void rgb3_to_rgb4(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbSha
 
 template <int S, int D>
 constexpr RgbToRgbRow rgb_to_rgb_variant() {
-    if constexpr (kRgbLayouts[S].bytesPerPixel == 3 && kRgbLayouts[D].bytesPerPixel == 4) {
+    if constexpr (kFormats[S].rgb.bytesPerPixel == 3 && kFormats[D].rgb.bytesPerPixel == 4) {
         return rgb3_to_rgb4<S, D>;
     } else {
         return rgb_to_rgb_bytes<S, D>;
@@ -69,12 +69,12 @@ constexpr auto kRgbToRgbRows = rgb_to_rgb_table(std::make_index_sequence<kRgbFor
 
 template <int S, int LumaStep>
 void rgb_to_luma(const uint8_t* rgb, uint8_t* luma, int width, const RgbToYuvShape&) {
-    rgb_to_luma_loop(rgb, luma, width, kRgbLayouts[S], LumaStep);
+    rgb_to_luma_loop(rgb, luma, width, kFormats[S].rgb, LumaStep);
 }
 
 template <int S, int ChromaStep>
 void rgb_to_chroma(const uint8_t* rgb, uint8_t* u, uint8_t* v, int pairs, const RgbToYuvShape&) {
-    rgb_to_chroma_loop(rgb, u, v, pairs, kRgbLayouts[S], ChromaStep);
+    rgb_to_chroma_loop(rgb, u, v, pairs, kFormats[S].rgb, ChromaStep);
 }
 
 template <size_t... I>
@@ -159,7 +159,7 @@ struct PairChannels {
 
 template <int D>
 inline void store_rgb(uint8_t* pixel, int luma, const PairChannels& c) {
-    constexpr RgbLayout d = kRgbLayouts[D];
+    constexpr RgbLayout d = kFormats[D].rgb;
     if constexpr (d.bytesPerPixel == 4) {
         // One word store per pixel instead of four byte stores.
         const uint32_t word = uint32_t{c.red[luma]} << (8 * d.rOffset) | uint32_t{c.green[luma]} << (8 * d.gOffset) |
@@ -174,7 +174,7 @@ inline void store_rgb(uint8_t* pixel, int luma, const PairChannels& c) {
 
 template <int D>
 inline void store_rgb_double(uint8_t* pixel, int luma, const ChromaProducts& chroma) {
-    constexpr RgbLayout d = kRgbLayouts[D];
+    constexpr RgbLayout d = kFormats[D].rgb;
     yuv_pixel_double(luma, chroma, &pixel[d.rOffset], &pixel[d.gOffset], &pixel[d.bOffset]);
     if constexpr (d.aOffset >= 0) pixel[d.aOffset] = 255;
 }
@@ -182,7 +182,7 @@ inline void store_rgb_double(uint8_t* pixel, int luma, const ChromaProducts& chr
 template <int D, int LumaStep, int ChromaStep, int Rows>
 void yuv_to_rgb(const uint8_t* y0, const uint8_t* y1, const uint8_t* u, const uint8_t* v, uint8_t* d0,
                 uint8_t* d1, int width, const YuvToRgbShape&) {
-    constexpr ptrdiff_t bpp = kRgbLayouts[D].bytesPerPixel;
+    constexpr ptrdiff_t bpp = kFormats[D].rgb.bytesPerPixel;
     for (ptrdiff_t j = 0; j < width / 2; ++j) {
         const int ub = u[j * ChromaStep];
         const int vb = v[j * ChromaStep];
@@ -228,7 +228,7 @@ constexpr auto kYuvToRgbRows = yuv_to_rgb_table(std::make_index_sequence<kRgbFor
 
 template <int D>
 void grey_to_rgb(const uint8_t* luma, uint8_t* dst, int width, const RgbLayout&) {
-    grey_to_rgb_loop(luma, dst, width, kRgbLayouts[D]);
+    grey_to_rgb_loop(luma, dst, width, kFormats[D].rgb);
 }
 
 template <size_t... I>

@@ -1,4 +1,8 @@
-// Format families and buffer geometry shared by the image operations.
+// Every format code the library knows, described once: its name, its
+// family, its size rule and where its bytes lie. The size rule, the family
+// tests, the conversion's layouts, the codec module and the command-line tool
+// all read this table: a new format is one more row plus the kernels that
+// serve it.
 #ifndef QKCORE_SRC_IMAGE_FORMAT_H
 #define QKCORE_SRC_IMAGE_FORMAT_H
 
@@ -8,22 +12,116 @@
 
 namespace qk {
 
-inline bool is_rgb_format(uint32_t f) {
-    return f == QK_FORMAT_RGBA || f == QK_FORMAT_BGRA || f == QK_FORMAT_ARGB || f == QK_FORMAT_ABGR ||
-           f == QK_FORMAT_RGB8 || f == QK_FORMAT_BGR8;
+enum class FormatFamily : uint8_t {
+    kRgb,        // packed R, G, B (and A) bytes
+    kYuv420,     // a luma plane, then one U and one V sample for each 2x2 pixels
+    kPacked422,  // luma and chroma interleaved, one U and one V for each 2x1 pixels
+    kGrey,       // luma only
+    kCopyOnly,   // pixels the library copies but never converts (D16, PCL)
+    kEncoded,    // a stream whose length the image records (JPEG)
+};
+
+// Bytes of a buffer of `pixels` pixels: `header` bytes, then bytes per pixel
+// as the fraction numerator / denominator, rounded up. No rule (encoded
+// formats): denominator 0.
+struct SizeRule {
+    uint32_t numerator;
+    uint32_t denominator;
+    uint32_t header;
+
+    // 0 without a rule. The caller keeps `pixels` small enough not to wrap.
+    constexpr uint64_t bytes(uint64_t pixels) const {
+        return denominator == 0 ? 0 : header + (numerator * pixels + denominator - 1) / denominator;
+    }
+};
+
+// One pixel of an RGB-family format; pixels and rows follow without gaps.
+struct RgbLayout {
+    int bytesPerPixel;  // 3 or 4
+    int rOffset;
+    int gOffset;
+    int bOffset;
+    int aOffset;  // -1: no alpha
+};
+
+struct FormatInfo {
+    uint32_t code;
+    const char* name;
+    FormatFamily family;
+    SizeRule size;
+    RgbLayout rgb;  // the RGB family's pixel; zero for other formats
+};
+
+// The RGB family comes first, in a fixed order: its row kernels are
+// instantiated per format by index into the table.
+constexpr int kRgbFormatCount = 6;
+
+inline constexpr FormatInfo kFormats[] = {
+    // code          name    family                     size: num, den, header
+    //                                                              RGB: bytes, R, G, B, A
+    {QK_FORMAT_RGB8, "RGB8", FormatFamily::kRgb, {3, 1, 0}, {3, 0, 1, 2, -1}},
+    {QK_FORMAT_BGR8, "BGR8", FormatFamily::kRgb, {3, 1, 0}, {3, 2, 1, 0, -1}},
+    {QK_FORMAT_RGBA, "RGBA", FormatFamily::kRgb, {4, 1, 0}, {4, 0, 1, 2, 3}},
+    {QK_FORMAT_BGRA, "BGRA", FormatFamily::kRgb, {4, 1, 0}, {4, 2, 1, 0, 3}},
+    {QK_FORMAT_ARGB, "ARGB", FormatFamily::kRgb, {4, 1, 0}, {4, 1, 2, 3, 0}},
+    {QK_FORMAT_ABGR, "ABGR", FormatFamily::kRgb, {4, 1, 0}, {4, 3, 2, 1, 0}},
+    {QK_FORMAT_GREY, "GREY", FormatFamily::kGrey, {1, 1, 0}, {}},
+    {QK_FORMAT_YUYV, "YUYV", FormatFamily::kPacked422, {2, 1, 0}, {}},
+    {QK_FORMAT_YVYU, "YVYU", FormatFamily::kPacked422, {2, 1, 0}, {}},
+    {QK_FORMAT_NV12, "NV12", FormatFamily::kYuv420, {3, 2, 0}, {}},
+    {QK_FORMAT_NV21, "NV21", FormatFamily::kYuv420, {3, 2, 0}, {}},
+    {QK_FORMAT_YV12, "YV12", FormatFamily::kYuv420, {3, 2, 0}, {}},
+    {QK_FORMAT_YUVP, "YUVP", FormatFamily::kYuv420, {3, 2, 0}, {}},
+    {QK_FORMAT_D16, "D16", FormatFamily::kCopyOnly, {2, 1, 0}, {}},
+    // A 36-byte header, its first word the point count, then 16 bytes a point.
+    {QK_FORMAT_PCL, "PCL", FormatFamily::kCopyOnly, {16, 1, 36}, {}},
+    {QK_FORMAT_JPEG, "JPEG", FormatFamily::kEncoded, {0, 0, 0}, {}},
+};
+
+namespace detail {
+constexpr bool rgb_rows_first() {
+    int index = 0;
+    for (const FormatInfo& format : kFormats) {
+        if ((index++ < kRgbFormatCount) != (format.family == FormatFamily::kRgb)) return false;
+    }
+    return true;
 }
-inline bool is_yuv420_format(uint32_t f) {
-    return f == QK_FORMAT_NV12 || f == QK_FORMAT_NV21 || f == QK_FORMAT_YV12 || f == QK_FORMAT_YUVP;
+// The size rule's range check relies on this: below 2^31 pixels no rule wraps.
+constexpr bool every_rule_at_least_a_byte_a_pixel() {
+    for (const FormatInfo& format : kFormats) {
+        if (format.size.denominator != 0 && format.size.numerator < format.size.denominator) return false;
+    }
+    return true;
 }
-inline bool is_packed422_format(uint32_t f) { return f == QK_FORMAT_YUYV || f == QK_FORMAT_YVYU; }
+}  // namespace detail
+static_assert(detail::rgb_rows_first(), "the RGB family, and only it, fills the first kRgbFormatCount rows");
+static_assert(detail::every_rule_at_least_a_byte_a_pixel(), "every size rule takes a byte a pixel or more");
+
+// The row of a format code; null for codes the library does not know.
+const FormatInfo* find_format(uint32_t code);
+
+inline bool format_in(uint32_t code, FormatFamily family) {
+    const FormatInfo* format = find_format(code);
+    return format != nullptr && format->family == family;
+}
+inline bool is_rgb_format(uint32_t f) { return format_in(f, FormatFamily::kRgb); }
+inline bool is_yuv420_format(uint32_t f) { return format_in(f, FormatFamily::kYuv420); }
+inline bool is_packed422_format(uint32_t f) { return format_in(f, FormatFamily::kPacked422); }
+// 4:2:0, packed 4:2:2 or GREY.
 inline bool is_yuv_format(uint32_t f) {
-    return is_yuv420_format(f) || is_packed422_format(f) || f == QK_FORMAT_GREY;
+    const FormatInfo* format = find_format(f);
+    return format != nullptr && (format->family == FormatFamily::kYuv420 ||
+                                 format->family == FormatFamily::kPacked422 || format->family == FormatFamily::kGrey);
 }
+
+// Index of an RGB-family format in kFormats (below kRgbFormatCount), or -1
+// outside the RGB family.
+int rgb_format_index(uint32_t code);
 
 // Bytes per pixel of the RGB family (3 or 4), 0 for other formats.
 inline int rgb_bytes_per_pixel(uint32_t f) {
-    if (f == QK_FORMAT_RGB8 || f == QK_FORMAT_BGR8) return 3;
-    return is_rgb_format(f) ? 4 : 0;
+    const FormatInfo* format = find_format(f);
+    return format != nullptr ? format->rgb.bytesPerPixel : 0;
 }
 
 // Offset of a 4:2:0 image's first chroma plane: its chromaOffset when

@@ -3,32 +3,6 @@
 #include "image/format.h"
 #include "qkcore/qk_image.h"
 
-namespace {
-
-// Bytes of a w x h buffer of the format, or 0 when the format has no size rule.
-uint64_t rule_size(uint64_t pixels, uint32_t format) {
-    switch (format) {
-        case QK_FORMAT_RGBA:
-        case QK_FORMAT_BGRA:
-        case QK_FORMAT_ARGB:
-        case QK_FORMAT_ABGR: return 4 * pixels;
-        case QK_FORMAT_RGB8:
-        case QK_FORMAT_BGR8: return 3 * pixels;
-        case QK_FORMAT_GREY: return pixels;
-        case QK_FORMAT_YUYV:
-        case QK_FORMAT_YVYU:
-        case QK_FORMAT_D16: return 2 * pixels;
-        case QK_FORMAT_NV12:
-        case QK_FORMAT_NV21:
-        case QK_FORMAT_YV12:
-        case QK_FORMAT_YUVP: return (3 * pixels + 1) / 2;
-        case QK_FORMAT_PCL: return 16 * pixels + 36;
-        default: return 0;
-    }
-}
-
-}  // namespace
-
 // Sizes are computed in 64 bits and refused past the signed 32-bit range of
 // byte counts, so a size that wrapped can never reach an allocation.
 uint64_t QKImage_requiredSize(int32_t width, int32_t height, uint32_t format) {
@@ -37,7 +11,8 @@ uint64_t QKImage_requiredSize(int32_t width, int32_t height, uint32_t format) {
     // Every format takes at least a byte a pixel, so more pixels than that is
     // out of range, and below it no rule can wrap (PCL's 16 x 2^62 would).
     if (pixels > INT32_MAX) return 0;
-    const uint64_t size = rule_size(pixels, format);
+    const qk::FormatInfo* info = qk::find_format(format);
+    const uint64_t size = info != nullptr ? info->size.bytes(pixels) : 0;
     return size > INT32_MAX ? 0 : size;
 }
 

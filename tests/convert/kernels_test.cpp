@@ -34,14 +34,14 @@ std::vector<Kernel> every_kernel() {
     std::vector<Kernel> all;
     auto add = [&all](const std::string& name, auto out_bytes, auto run) { all.push_back({name, out_bytes, run}); };
     for (int s = 0; s < kRgbFormatCount; ++s) {
-        const RgbLayout rgb = kRgbLayouts[s];
+        const RgbLayout rgb = kFormats[s].rgb;
         const std::string from = std::to_string(s);
         add("grey to " + from, [=](int w) { return size_t(w) * rgb.bytesPerPixel; },
             [=](bool ref, int w, uint8_t* in, uint8_t* out) {
                 (ref ? grey_to_rgb_row_reference : select_grey_to_rgb_row(s))(in, out, w, rgb);
             });
         for (int d = 0; d < kRgbFormatCount; ++d) {
-            const RgbToRgbShape shape{rgb, kRgbLayouts[d]};
+            const RgbToRgbShape shape{rgb, kFormats[d].rgb};
             add(from + " to " + std::to_string(d), [=](int w) { return size_t(w) * shape.dst.bytesPerPixel; },
                 [=](bool ref, int w, uint8_t* in, uint8_t* out) {
                     (ref ? rgb_to_rgb_row_reference : select_rgb_to_rgb_row(s, d))(in, out, w, shape);
@@ -119,7 +119,7 @@ TEST(Exhaustive, RgbToYuvGivesTheFormulaForEveryColour) {
     // pixel whose colour the chroma is taken from; the odd pixels hold other
     // colours, (255 - r, b, g), so a kernel reading the wrong pixel of a pair shows.
     const int index = rgb_format_index(QK_FORMAT_BGR8);
-    const RgbToYuvShape shape{kRgbLayouts[index], 1, 1};
+    const RgbToYuvShape shape{kFormats[index].rgb, 1, 1};
     const RgbToLumaRow lumaRow = select_rgb_to_luma_row(index, 1);
     const RgbToChromaRow chromaRow = select_rgb_to_chroma_row(index, 1);
     constexpr int kPairs = 65536;
@@ -147,7 +147,7 @@ TEST(Exhaustive, YuvToRgbMatchesDoublePrecisionForEveryTriple) {
     // For each chroma pair, two rows of 128 lumas (0..127 and 128..255) that
     // share 64 copies of that pair, as a 4:2:0 row pair does.
     const int index = rgb_format_index(QK_FORMAT_RGBA);
-    const YuvToRgbShape shape{1, 2, 2, kRgbLayouts[index]};
+    const YuvToRgbShape shape{1, 2, 2, kFormats[index].rgb};
     const YuvToRgbRow row = select_yuv_to_rgb_row(index, 1, 2, 2);
     constexpr int kWidth = 128;
     std::vector<uint8_t> luma(2 * kWidth), chroma(kWidth), rgba(2 * kWidth * 4);
