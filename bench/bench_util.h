@@ -1,11 +1,16 @@
-// Shared by the benchmarks: the frame sizes, the rate counters, and a log
-// hook that keeps per-call messages out of what is measured.
+// Shared by the benchmarks: the frame sizes, the rate counters, names from
+// the format table, and a log hook that keeps per-call messages out of what
+// is measured.
 #ifndef QKCORE_BENCH_BENCH_UTIL_H
 #define QKCORE_BENCH_BENCH_UTIL_H
 
 #include <benchmark/benchmark.h>
+#include <ctype.h>
 #include <stdint.h>
 
+#include <string>
+
+#include "image/format.h"
 #include "qkcore/qk_log.h"
 
 namespace qkbench {
@@ -23,6 +28,22 @@ inline void set_rates(benchmark::State& state, int64_t pixels, uint64_t bytes = 
     if (bytes != 0) state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * bytes));
     state.counters["Mpixel/s"] = benchmark::Counter(static_cast<double>(state.iterations()) * pixels / 1e6,
                                                     benchmark::Counter::kIsRate);
+}
+
+// A format as benchmark names show it: its name in the table, lower case.
+inline std::string format_label(uint32_t format) {
+    const qk::FormatInfo* info = qk::find_format(format);
+    std::string label = info != nullptr ? info->name : "unknown";
+    for (char& c : label) c = static_cast<char>(tolower(static_cast<unsigned char>(c)));
+    return label;
+}
+
+// Registers fn(state, format, args...) as "<name>/<format label><suffix>".
+template <typename Fn, typename... Args>
+benchmark::internal::Benchmark* register_for_format(const char* name, uint32_t format, const std::string& suffix,
+                                                    Fn fn, Args... args) {
+    const std::string full = std::string(name) + "/" + format_label(format) + suffix;
+    return benchmark::RegisterBenchmark(full.c_str(), fn, format, args...);
 }
 
 // Silences the library's messages for the scope.

@@ -4,6 +4,7 @@
 #include <string.h>
 
 #include <random>
+#include <string>
 #include <vector>
 
 #include "bench_util.h"
@@ -36,29 +37,41 @@ void BM_Convert(benchmark::State& state, uint32_t from, uint32_t to) {
     QKImage_destroy(dst);
 }
 
-#define QK_CONVERT_BENCH(name, from, to) BENCHMARK_CAPTURE(BM_Convert, name, from, to)->Apply(frame_sizes)
+// Named after the formats: "BM_Convert/nv21_to_rgba", "BM_Convert/copy_nv21".
+const struct {
+    uint32_t from, to;
+} kConversions[] = {
+    // RGB to YUV
+    {QK_FORMAT_BGRA, QK_FORMAT_NV12},
+    {QK_FORMAT_RGBA, QK_FORMAT_NV21},
+    {QK_FORMAT_RGB8, QK_FORMAT_YUVP},
+    {QK_FORMAT_RGBA, QK_FORMAT_GREY},
+    // YUV to RGB
+    {QK_FORMAT_NV21, QK_FORMAT_RGBA},
+    {QK_FORMAT_NV12, QK_FORMAT_BGRA},
+    {QK_FORMAT_YUVP, QK_FORMAT_RGB8},
+    {QK_FORMAT_YUYV, QK_FORMAT_BGRA},
+    {QK_FORMAT_GREY, QK_FORMAT_BGRA},
+    // YUV layouts
+    {QK_FORMAT_NV12, QK_FORMAT_NV21},
+    {QK_FORMAT_NV12, QK_FORMAT_YUVP},
+    {QK_FORMAT_YUYV, QK_FORMAT_NV12},
+    {QK_FORMAT_YUVP, QK_FORMAT_YUYV},
+    // RGB reordering
+    {QK_FORMAT_RGBA, QK_FORMAT_BGRA},
+    {QK_FORMAT_RGB8, QK_FORMAT_RGBA},
+    // Same format
+    {QK_FORMAT_NV21, QK_FORMAT_NV21},
+    {QK_FORMAT_RGBA, QK_FORMAT_RGBA},
+};
 
-// RGB to YUV
-QK_CONVERT_BENCH(bgra_to_nv12, QK_FORMAT_BGRA, QK_FORMAT_NV12);
-QK_CONVERT_BENCH(rgba_to_nv21, QK_FORMAT_RGBA, QK_FORMAT_NV21);
-QK_CONVERT_BENCH(rgb8_to_yuvp, QK_FORMAT_RGB8, QK_FORMAT_YUVP);
-QK_CONVERT_BENCH(rgba_to_grey, QK_FORMAT_RGBA, QK_FORMAT_GREY);
-// YUV to RGB
-QK_CONVERT_BENCH(nv21_to_rgba, QK_FORMAT_NV21, QK_FORMAT_RGBA);
-QK_CONVERT_BENCH(nv12_to_bgra, QK_FORMAT_NV12, QK_FORMAT_BGRA);
-QK_CONVERT_BENCH(yuvp_to_rgb8, QK_FORMAT_YUVP, QK_FORMAT_RGB8);
-QK_CONVERT_BENCH(yuyv_to_bgra, QK_FORMAT_YUYV, QK_FORMAT_BGRA);
-QK_CONVERT_BENCH(grey_to_bgra, QK_FORMAT_GREY, QK_FORMAT_BGRA);
-// YUV layouts
-QK_CONVERT_BENCH(nv12_to_nv21, QK_FORMAT_NV12, QK_FORMAT_NV21);
-QK_CONVERT_BENCH(nv12_to_yuvp, QK_FORMAT_NV12, QK_FORMAT_YUVP);
-QK_CONVERT_BENCH(yuyv_to_nv12, QK_FORMAT_YUYV, QK_FORMAT_NV12);
-QK_CONVERT_BENCH(yuvp_to_yuyv, QK_FORMAT_YUVP, QK_FORMAT_YUYV);
-// RGB reordering
-QK_CONVERT_BENCH(rgba_to_bgra, QK_FORMAT_RGBA, QK_FORMAT_BGRA);
-QK_CONVERT_BENCH(rgb8_to_rgba, QK_FORMAT_RGB8, QK_FORMAT_RGBA);
-// Same format
-QK_CONVERT_BENCH(copy_nv21, QK_FORMAT_NV21, QK_FORMAT_NV21);
-QK_CONVERT_BENCH(copy_rgba, QK_FORMAT_RGBA, QK_FORMAT_RGBA);
+[[maybe_unused]] const bool kRegistered = [] {
+    for (const auto& c : kConversions) {
+        const std::string name = c.from == c.to ? "BM_Convert/copy_" + format_label(c.from)
+                                                : "BM_Convert/" + format_label(c.from) + "_to_" + format_label(c.to);
+        benchmark::RegisterBenchmark(name.c_str(), BM_Convert, c.from, c.to)->Apply(frame_sizes);
+    }
+    return true;
+}();
 
 }  // namespace

@@ -5,6 +5,9 @@
 #include <benchmark/benchmark.h>
 #include <string.h>
 
+#include <string>
+#include <utility>
+
 #include "bench_util.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
@@ -37,10 +40,14 @@ void BM_Rotate(benchmark::State& state, uint32_t format, int32_t angle) {
     set_rates(state, int64_t{kWidth} * kHeight);
     QKImage_destroy(image);
 }
-BENCHMARK_CAPTURE(BM_Rotate, rgba_90, QK_FORMAT_RGBA, 90)->Unit(benchmark::kMillisecond);
-BENCHMARK_CAPTURE(BM_Rotate, rgba_180, QK_FORMAT_RGBA, 180)->Unit(benchmark::kMillisecond);
-BENCHMARK_CAPTURE(BM_Rotate, rgba_270, QK_FORMAT_RGBA, 270)->Unit(benchmark::kMillisecond);
-BENCHMARK_CAPTURE(BM_Rotate, nv21_90, QK_FORMAT_NV21, 90)->Unit(benchmark::kMillisecond);
+[[maybe_unused]] const bool kRotations = [] {
+    for (auto [format, angle] : {std::pair{QK_FORMAT_RGBA, 90}, {QK_FORMAT_RGBA, 180}, {QK_FORMAT_RGBA, 270},
+                                 {QK_FORMAT_NV21, 90}}) {
+        register_for_format("BM_Rotate", format, "_" + std::to_string(angle), BM_Rotate, angle)
+            ->Unit(benchmark::kMillisecond);
+    }
+    return true;
+}();
 
 // The raster layer's turned drawing alone, blending onto a bitmap that
 // already exists. The library's angle 90 is three clockwise quarter turns
@@ -100,8 +107,12 @@ void BM_Crop(benchmark::State& state, uint32_t format) {
     QKImage_destroy(target);
     QKImage_destroy(source);
 }
-BENCHMARK_CAPTURE(BM_Crop, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
-BENCHMARK_CAPTURE(BM_Crop, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+[[maybe_unused]] const bool kCropRegistered = [] {
+    for (uint32_t format : {QK_FORMAT_RGBA, QK_FORMAT_NV12}) {
+        register_for_format("BM_Crop", format, "_centre_half", BM_Crop)->Unit(benchmark::kMicrosecond);
+    }
+    return true;
+}();
 
 // A half-size picture drawn into the centre of a frame.
 void BM_Draw(benchmark::State& state, uint32_t format) {
@@ -119,8 +130,12 @@ void BM_Draw(benchmark::State& state, uint32_t format) {
     QKImage_destroy(frame);
     QKImage_destroy(picture);
 }
-BENCHMARK_CAPTURE(BM_Draw, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
-BENCHMARK_CAPTURE(BM_Draw, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+[[maybe_unused]] const bool kDrawRegistered = [] {
+    for (uint32_t format : {QK_FORMAT_RGBA, QK_FORMAT_NV12}) {
+        register_for_format("BM_Draw", format, "_centre_half", BM_Draw)->Unit(benchmark::kMicrosecond);
+    }
+    return true;
+}();
 
 // Yardstick for crop and draw: the rows of the centred half-size rectangle
 // copied with one plain memcpy each (luma, then chroma rows for NV12).
@@ -146,7 +161,11 @@ void BM_MemcpyRows(benchmark::State& state, uint32_t format) {
     QKImage_destroy(part);
     QKImage_destroy(frame);
 }
-BENCHMARK_CAPTURE(BM_MemcpyRows, rgba_centre_half, QK_FORMAT_RGBA)->Unit(benchmark::kMicrosecond);
-BENCHMARK_CAPTURE(BM_MemcpyRows, nv12_centre_half, QK_FORMAT_NV12)->Unit(benchmark::kMicrosecond);
+[[maybe_unused]] const bool kMemcpyRowsRegistered = [] {
+    for (uint32_t format : {QK_FORMAT_RGBA, QK_FORMAT_NV12}) {
+        register_for_format("BM_MemcpyRows", format, "_centre_half", BM_MemcpyRows)->Unit(benchmark::kMicrosecond);
+    }
+    return true;
+}();
 
 }  // namespace

@@ -24,8 +24,6 @@ void BM_Memcpy(benchmark::State& state, uint32_t format) {
     }
     set_rates(state, int64_t{width} * height, bytes);
 }
-BENCHMARK_CAPTURE(BM_Memcpy, rgba, QK_FORMAT_RGBA)->Apply(frame_sizes);
-BENCHMARK_CAPTURE(BM_Memcpy, nv21, QK_FORMAT_NV21)->Apply(frame_sizes);
 
 void BM_Clone(benchmark::State& state, uint32_t format) {
     QKImage* source = QKImage_createNew(kWidth, kHeight, format);
@@ -38,7 +36,13 @@ void BM_Clone(benchmark::State& state, uint32_t format) {
     set_rates(state, int64_t{kWidth} * kHeight, source->size);
     QKImage_destroy(source);
 }
-BENCHMARK_CAPTURE(BM_Clone, rgba_4000x3000, QK_FORMAT_RGBA)->Unit(benchmark::kMillisecond);
-BENCHMARK_CAPTURE(BM_Clone, nv21_4000x3000, QK_FORMAT_NV21)->Unit(benchmark::kMillisecond);
+
+[[maybe_unused]] const bool kRegistered = [] {
+    for (uint32_t format : {QK_FORMAT_RGBA, QK_FORMAT_NV21}) {
+        register_for_format("BM_Memcpy", format, "", BM_Memcpy)->Apply(frame_sizes);
+        register_for_format("BM_Clone", format, "_4000x3000", BM_Clone)->Unit(benchmark::kMillisecond);
+    }
+    return true;
+}();
 
 }  // namespace

@@ -5,14 +5,14 @@
 #include <stddef.h>
 #include <string.h>
 
-#include "convert/layout.h"
 #include "convert/row.h"
+#include "image/format.h"
 
 namespace qk {
 namespace {
 
-// Byte offset, from uOffset (or vOffset), of the chroma row that serves image
-// row y.
+// Byte offset, from the first U (or V) sample, of the chroma row that serves
+// image row y.
 ptrdiff_t chroma_row_offset(const YuvLayout& layout, ptrdiff_t y, ptrdiff_t width) {
     return (layout.subsampledRows ? y / 2 : y) * (width / 2) * layout.chromaStep;
 }
@@ -39,7 +39,8 @@ void convert_rgb_to_rgb(const QKImage& src, QKImage& dst) {
 
 void convert_rgb_to_yuv(const QKImage& src, QKImage& dst) {
     const int s = rgb_format_index(src.format);
-    const YuvLayout out = yuv_layout(dst);
+    const YuvLayout out = yuv_layout(dst.format);
+    const ChromaStart out_chroma = chroma_start(dst);
     const RgbToYuvShape shape{kFormats[s].rgb, out.lumaStep, out.chromaStep};
     const RgbToLumaRow luma = select_rgb_to_luma_row(s, out.lumaStep);
     const RgbToChromaRow chroma = select_rgb_to_chroma_row(s, out.chromaStep);
@@ -49,13 +50,14 @@ void convert_rgb_to_yuv(const QKImage& src, QKImage& dst) {
         luma(in, dst.data + y * width * out.lumaStep, src.width, shape);
         if (row_carries_chroma(out, y)) {
             const ptrdiff_t offset = chroma_row_offset(out, y, width);
-            chroma(in, dst.data + out.uOffset + offset, dst.data + out.vOffset + offset, src.width / 2, shape);
+            chroma(in, dst.data + out_chroma.u + offset, dst.data + out_chroma.v + offset, src.width / 2, shape);
         }
     }
 }
 
 void convert_yuv_to_rgb(const QKImage& src, QKImage& dst) {
-    const YuvLayout in = yuv_layout(src);
+    const YuvLayout in = yuv_layout(src.format);
+    const ChromaStart in_chroma = chroma_start(src);
     const int d = rgb_format_index(dst.format);
     const RgbLayout& out = kFormats[d].rgb;
     const ptrdiff_t width = src.width;
@@ -74,14 +76,16 @@ void convert_yuv_to_rgb(const QKImage& src, QKImage& dst) {
         const ptrdiff_t offset = chroma_row_offset(in, y, width);
         const uint8_t* luma = src.data + y * lumaRowBytes;
         uint8_t* pixels = dst.data + y * rowBytes;
-        row(luma, rows == 2 ? luma + lumaRowBytes : nullptr, src.data + in.uOffset + offset,
-            src.data + in.vOffset + offset, pixels, rows == 2 ? pixels + rowBytes : nullptr, src.width, shape);
+        row(luma, rows == 2 ? luma + lumaRowBytes : nullptr, src.data + in_chroma.u + offset,
+            src.data + in_chroma.v + offset, pixels, rows == 2 ? pixels + rowBytes : nullptr, src.width, shape);
     }
 }
 
 void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
-    const YuvLayout in = yuv_layout(src);
-    const YuvLayout out = yuv_layout(dst);
+    const YuvLayout in = yuv_layout(src.format);
+    const YuvLayout out = yuv_layout(dst.format);
+    const ChromaStart in_chroma = chroma_start(src);
+    const ChromaStart out_chroma = chroma_start(dst);
     const ptrdiff_t width = src.width;
     // Planar luma on both sides is one block; otherwise luma moves row by
     // row together with the chroma of the same rows, while they are cached.
@@ -95,14 +99,14 @@ void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
                  src.width);
         }
         if (!row_carries_chroma(out, y)) continue;
-        uint8_t* u = dst.data + out.uOffset + chroma_row_offset(out, y, width);
-        uint8_t* v = dst.data + out.vOffset + chroma_row_offset(out, y, width);
+        uint8_t* u = dst.data + out_chroma.u + chroma_row_offset(out, y, width);
+        uint8_t* v = dst.data + out_chroma.v + chroma_row_offset(out, y, width);
         if (in.chromaStep == 0) {
             // Chroma made from GREY is 127, not the neutral 128.
             fill_chroma_row(u, v, out.chromaStep, src.width / 2, 127);
         } else {
             const ptrdiff_t offset = chroma_row_offset(in, y, width);
-            chroma(src.data + in.uOffset + offset, src.data + in.vOffset + offset, in.chromaStep, u, v,
+            chroma(src.data + in_chroma.u + offset, src.data + in_chroma.v + offset, in.chromaStep, u, v,
                    out.chromaStep, src.width / 2);
         }
     }

@@ -8,7 +8,7 @@
 
 #include <stdint.h>
 
-#include "convert/layout.h"
+#include "image/format.h"
 
 namespace qk {
 

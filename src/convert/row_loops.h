@@ -8,8 +8,8 @@
 #include <stddef.h>
 #include <stdint.h>
 
-#include "convert/layout.h"
 #include "convert/pixel.h"
+#include "image/format.h"
 
 #define QK_ROW_LOOP [[gnu::always_inline]] inline
 

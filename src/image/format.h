@@ -44,12 +44,29 @@ struct RgbLayout {
     int aOffset;  // -1: no alpha
 };
 
+// Where the samples of a YUV-family format lie. Luma sample x of row y is at
+// (y * width + x) * lumaStep; U sample j of chroma row r at
+// u + (r * width / 2 + j) * chromaStep, V likewise from v, where u (v) is
+// uOffset (vOffset) bytes plus uPlanes (vPlanes) chroma planes of
+// width x height / 4 bytes past the chroma base for 4:2:0, and uOffset
+// (vOffset) bytes from the buffer start for packed 4:2:2.
+struct YuvLayout {
+    int lumaStep;         // 1 or 2
+    int chromaStep;       // 1, 2 or 4; 0 for GREY, which has no chroma
+    bool subsampledRows;  // 4:2:0: one chroma row serves two image rows
+    int uOffset;
+    int uPlanes;
+    int vOffset;
+    int vPlanes;
+};
+
 struct FormatInfo {
     uint32_t code;
     const char* name;
     FormatFamily family;
     SizeRule size;
     RgbLayout rgb;  // the RGB family's pixel; zero for other formats
+    YuvLayout yuv;  // 4:2:0, packed 4:2:2 and GREY; zero (lumaStep 0) for other formats
 };
 
 // The RGB family comes first, in a fixed order: its row kernels are
@@ -57,25 +74,27 @@ struct FormatInfo {
 constexpr int kRgbFormatCount = 6;
 
 inline constexpr FormatInfo kFormats[] = {
-    // code          name    family                     size: num, den, header
-    //                                                              RGB: bytes, R, G, B, A
-    {QK_FORMAT_RGB8, "RGB8", FormatFamily::kRgb, {3, 1, 0}, {3, 0, 1, 2, -1}},
-    {QK_FORMAT_BGR8, "BGR8", FormatFamily::kRgb, {3, 1, 0}, {3, 2, 1, 0, -1}},
-    {QK_FORMAT_RGBA, "RGBA", FormatFamily::kRgb, {4, 1, 0}, {4, 0, 1, 2, 3}},
-    {QK_FORMAT_BGRA, "BGRA", FormatFamily::kRgb, {4, 1, 0}, {4, 2, 1, 0, 3}},
-    {QK_FORMAT_ARGB, "ARGB", FormatFamily::kRgb, {4, 1, 0}, {4, 1, 2, 3, 0}},
-    {QK_FORMAT_ABGR, "ABGR", FormatFamily::kRgb, {4, 1, 0}, {4, 3, 2, 1, 0}},
-    {QK_FORMAT_GREY, "GREY", FormatFamily::kGrey, {1, 1, 0}, {}},
-    {QK_FORMAT_YUYV, "YUYV", FormatFamily::kPacked422, {2, 1, 0}, {}},
-    {QK_FORMAT_YVYU, "YVYU", FormatFamily::kPacked422, {2, 1, 0}, {}},
-    {QK_FORMAT_NV12, "NV12", FormatFamily::kYuv420, {3, 2, 0}, {}},
-    {QK_FORMAT_NV21, "NV21", FormatFamily::kYuv420, {3, 2, 0}, {}},
-    {QK_FORMAT_YV12, "YV12", FormatFamily::kYuv420, {3, 2, 0}, {}},
-    {QK_FORMAT_YUVP, "YUVP", FormatFamily::kYuv420, {3, 2, 0}, {}},
-    {QK_FORMAT_D16, "D16", FormatFamily::kCopyOnly, {2, 1, 0}, {}},
+    // Code, name, family; size rule {numerator, denominator, header}; RGB
+    // layout {bytes a pixel, R, G, B, A}; YUV layout {luma step, chroma step,
+    // subsampled rows, U offset, U planes, V offset, V planes}.
+    {QK_FORMAT_RGB8, "RGB8", FormatFamily::kRgb, {3, 1, 0}, {3, 0, 1, 2, -1}, {}},
+    {QK_FORMAT_BGR8, "BGR8", FormatFamily::kRgb, {3, 1, 0}, {3, 2, 1, 0, -1}, {}},
+    {QK_FORMAT_RGBA, "RGBA", FormatFamily::kRgb, {4, 1, 0}, {4, 0, 1, 2, 3}, {}},
+    {QK_FORMAT_BGRA, "BGRA", FormatFamily::kRgb, {4, 1, 0}, {4, 2, 1, 0, 3}, {}},
+    {QK_FORMAT_ARGB, "ARGB", FormatFamily::kRgb, {4, 1, 0}, {4, 1, 2, 3, 0}, {}},
+    {QK_FORMAT_ABGR, "ABGR", FormatFamily::kRgb, {4, 1, 0}, {4, 3, 2, 1, 0}, {}},
+    {QK_FORMAT_GREY, "GREY", FormatFamily::kGrey, {1, 1, 0}, {}, {1, 0, false, 0, 0, 0, 0}},
+    {QK_FORMAT_YUYV, "YUYV", FormatFamily::kPacked422, {2, 1, 0}, {}, {2, 4, false, 1, 0, 3, 0}},
+    {QK_FORMAT_YVYU, "YVYU", FormatFamily::kPacked422, {2, 1, 0}, {}, {2, 4, false, 3, 0, 1, 0}},
+    // U V pairs, V U pairs, a V plane then a U plane, a U plane then a V plane.
+    {QK_FORMAT_NV12, "NV12", FormatFamily::kYuv420, {3, 2, 0}, {}, {1, 2, true, 0, 0, 1, 0}},
+    {QK_FORMAT_NV21, "NV21", FormatFamily::kYuv420, {3, 2, 0}, {}, {1, 2, true, 1, 0, 0, 0}},
+    {QK_FORMAT_YV12, "YV12", FormatFamily::kYuv420, {3, 2, 0}, {}, {1, 1, true, 0, 1, 0, 0}},
+    {QK_FORMAT_YUVP, "YUVP", FormatFamily::kYuv420, {3, 2, 0}, {}, {1, 1, true, 0, 0, 0, 1}},
+    {QK_FORMAT_D16, "D16", FormatFamily::kCopyOnly, {2, 1, 0}, {}, {}},
     // A 36-byte header, its first word the point count, then 16 bytes a point.
-    {QK_FORMAT_PCL, "PCL", FormatFamily::kCopyOnly, {16, 1, 36}, {}},
-    {QK_FORMAT_JPEG, "JPEG", FormatFamily::kEncoded, {0, 0, 0}, {}},
+    {QK_FORMAT_PCL, "PCL", FormatFamily::kCopyOnly, {16, 1, 36}, {}, {}},
+    {QK_FORMAT_JPEG, "JPEG", FormatFamily::kEncoded, {0, 0, 0}, {}, {}},
 };
 
 namespace detail {
@@ -118,6 +137,14 @@ inline bool is_yuv_format(uint32_t f) {
 // outside the RGB family.
 int rgb_format_index(uint32_t code);
 
+// The YUV layout of a format: lumaStep 0 outside the YUV family.
+const YuvLayout& yuv_layout(uint32_t code);
+
+// Whether one chroma sample serves two columns (4:2:0 and packed 4:2:2) and
+// two rows (4:2:0): the dimensions such a format needs even.
+inline bool chroma_pairs_columns(uint32_t code) { return yuv_layout(code).chromaStep != 0; }
+inline bool chroma_pairs_rows(uint32_t code) { return yuv_layout(code).subsampledRows; }
+
 // Bytes per pixel of the RGB family (3 or 4), 0 for other formats.
 inline int rgb_bytes_per_pixel(uint32_t f) {
     const FormatInfo* format = find_format(f);
@@ -144,22 +171,15 @@ inline uint64_t yuv420_extent(uint32_t chromaOffset, int32_t width, int32_t heig
     return chroma_end > luma ? chroma_end : luma;
 }
 
-// Where the U and V samples of a 4:2:0 image start: NV12 and NV21 interleave
-// them from the chroma base, YV12 and YUVP hold two planes of
-// (width x height) / 4 bytes each.
+// Where the first U and V samples of a YUV-family picture lie, from the
+// buffer start; for 4:2:0 from the given chroma base. GREY gives {0, 0}.
 struct ChromaStart {
     uint64_t u;
     uint64_t v;
 };
+ChromaStart chroma_start(uint32_t format, uint64_t base, int32_t width, int32_t height);
 inline ChromaStart chroma_start(const QKImage& image) {
-    const uint64_t base = chroma_base(image);
-    const uint64_t plane = static_cast<uint64_t>(static_cast<int64_t>(image.width) * image.height / 4);
-    switch (image.format) {
-        case QK_FORMAT_NV12: return {base, base + 1};
-        case QK_FORMAT_NV21: return {base + 1, base};
-        case QK_FORMAT_YV12: return {base + plane, base};
-        default: return {base, base + plane};  // YUVP
-    }
+    return chroma_start(image.format, chroma_base(image), image.width, image.height);
 }
 
 // True when the image's buffer holds the whole picture that its width,

@@ -11,9 +11,9 @@
 #include <tuple>
 #include <vector>
 
-#include "convert/layout.h"
 #include "convert/reference_frame.h"
 #include "convert/row.h"
+#include "image/format.h"
 
 namespace {
 

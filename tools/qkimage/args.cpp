@@ -5,42 +5,57 @@
 #include <string.h>
 #include <strings.h>
 
+#include "image/format.h"
 #include "qkcore/qk_image.h"
 
 bool g_verbose = false;
 
-const FormatName kFormats[] = {
-    {"YUVP", QK_FORMAT_YUVP, "yuv420p,I420", "4:2:0: Y plane, U plane, V plane"},
-    {"YV12", QK_FORMAT_YV12, "yvu420p", "4:2:0: Y plane, V plane, U plane"},
-    {"NV12", QK_FORMAT_NV12, "", "4:2:0: Y plane, then U V pairs"},
-    {"NV21", QK_FORMAT_NV21, "", "4:2:0: Y plane, then V U pairs (camera frames)"},
-    {"YUYV", QK_FORMAT_YUYV, "yuyv422,YUY2", "4:2:2 packed: Y0 U Y1 V"},
-    {"YVYU", QK_FORMAT_YVYU, "yvyu422", "4:2:2 packed: Y0 V Y1 U"},
-    {"GREY", QK_FORMAT_GREY, "gray,y8", "luma only, a byte a pixel"},
-    {"RGB8", QK_FORMAT_RGB8, "rgb24", "R G B, 3 bytes a pixel"},
-    {"BGR8", QK_FORMAT_BGR8, "bgr24", "B G R, 3 bytes a pixel"},
-    {"RGBA", QK_FORMAT_RGBA, "", "R G B A, 4 bytes a pixel"},
-    {"BGRA", QK_FORMAT_BGRA, "", "B G R A"},
-    {"ARGB", QK_FORMAT_ARGB, "", "A R G B"},
-    {"ABGR", QK_FORMAT_ABGR, "", "A B G R"},
-    {"D16", QK_FORMAT_D16, "", "16-bit depth samples (copied only)"},
-    {"PCL", QK_FORMAT_PCL, "", "point cloud: 36-byte header + 16 bytes a point (copied only)"},
-    {"JPEG", QK_FORMAT_JPEG, "", "an encoded stream, not a raw frame"},
+namespace {
+
+const FormatNote kNotes[] = {
+    {QK_FORMAT_RGB8, "rgb24", "R G B, 3 bytes a pixel"},
+    {QK_FORMAT_BGR8, "bgr24", "B G R, 3 bytes a pixel"},
+    {QK_FORMAT_RGBA, "", "R G B A, 4 bytes a pixel"},
+    {QK_FORMAT_BGRA, "", "B G R A"},
+    {QK_FORMAT_ARGB, "", "A R G B"},
+    {QK_FORMAT_ABGR, "", "A B G R"},
+    {QK_FORMAT_GREY, "gray,y8", "luma only, a byte a pixel"},
+    {QK_FORMAT_YUYV, "yuyv422,YUY2", "4:2:2 packed: Y0 U Y1 V"},
+    {QK_FORMAT_YVYU, "yvyu422", "4:2:2 packed: Y0 V Y1 U"},
+    {QK_FORMAT_NV12, "", "4:2:0: Y plane, then U V pairs"},
+    {QK_FORMAT_NV21, "", "4:2:0: Y plane, then V U pairs (camera frames)"},
+    {QK_FORMAT_YV12, "yvu420p", "4:2:0: Y plane, V plane, U plane"},
+    {QK_FORMAT_YUVP, "yuv420p,I420", "4:2:0: Y plane, U plane, V plane"},
+    {QK_FORMAT_D16, "", "16-bit depth samples (copied only)"},
+    {QK_FORMAT_PCL, "", "point cloud: 36-byte header + 16 bytes a point (copied only)"},
+    {QK_FORMAT_JPEG, "", "an encoded stream, not a raw frame"},
 };
-const int kFormatCount = sizeof(kFormats) / sizeof(kFormats[0]);
+
+// Whether `text` is one of the comma-separated words of `list`.
+bool in_list(const char* text, const char* list) {
+    const size_t length = strlen(text);
+    for (const char* word = list; *word != '\0';) {
+        const char* comma = strchr(word, ',');
+        const size_t word_length = comma != nullptr ? size_t(comma - word) : strlen(word);
+        if (word_length == length && strncasecmp(text, word, length) == 0) return true;
+        word += word_length + (comma != nullptr ? 1 : 0);
+    }
+    return false;
+}
+
+}  // namespace
+
+const FormatNote& format_note(uint32_t code) {
+    static const FormatNote kNone = {0, "", ""};
+    for (const FormatNote& note : kNotes) {
+        if (note.code == code) return note;
+    }
+    return kNone;
+}
 
 bool parse_format(const char* text, uint32_t* code) {
-    const size_t length = strlen(text);
-    for (const FormatName& format : kFormats) {
-        bool found = strcasecmp(text, format.name) == 0;
-        // Each alias is a comma-terminated (or final) word of the list.
-        for (const char* alias = format.aliases; !found && *alias != '\0';) {
-            const char* comma = strchr(alias, ',');
-            const size_t alias_length = comma != nullptr ? size_t(comma - alias) : strlen(alias);
-            found = alias_length == length && strncasecmp(text, alias, length) == 0;
-            alias += alias_length + (comma != nullptr ? 1 : 0);
-        }
-        if (found) {
+    for (const qk::FormatInfo& format : qk::kFormats) {
+        if (strcasecmp(text, format.name) == 0 || in_list(text, format_note(format.code).aliases)) {
             *code = format.code;
             return true;
         }
@@ -49,10 +64,8 @@ bool parse_format(const char* text, uint32_t* code) {
 }
 
 std::string format_name(uint32_t code) {
-    for (const FormatName& format : kFormats) {
-        if (format.code == code) return format.name;
-    }
-    return "????";
+    const qk::FormatInfo* format = qk::find_format(code);
+    return format != nullptr ? format->name : "????";
 }
 
 bool parse_number(const char* text, const char** end, int64_t min, int64_t max, int32_t* value) {

@@ -9,16 +9,15 @@
 #include <string>
 #include <vector>
 
-struct FormatName {
-    const char* name;     // the library's name, "NV21"
+// What the tool adds to the library's format table: common names of the
+// same layouts, accepted too, and a line for the help.
+struct FormatNote {
     uint32_t code;
-    const char* aliases;  // common equivalents, comma-separated, "" for none
-    const char* about;    // one line for the help
+    const char* aliases;  // comma-separated, "" for none
+    const char* about;
 };
-
-// Every format code the library knows, in a stable order.
-extern const FormatName kFormats[];
-extern const int kFormatCount;
+// The note on a format; no aliases and no line for a format without one.
+const FormatNote& format_note(uint32_t code);
 
 // "NV21", "nv21", "I420", "yuv420p"... -> its code (letter case ignored);
 // false for unknown names.

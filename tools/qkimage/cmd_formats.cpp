@@ -2,6 +2,7 @@
 
 #include "args.h"
 #include "commands.h"
+#include "image/format.h"
 #include "qkcore/qk_image.h"
 
 int cmd_formats(int argc, char** argv) {
@@ -18,15 +19,17 @@ int cmd_formats(int argc, char** argv) {
     // A raw format without a size at these dimensions is past the 2 GiB
     // limit of byte counts; when every one is, there is no table to show.
     bool any = false;
-    for (int i = 0; i < kFormatCount; ++i) any = any || QKImage_requiredSize(width, height, kFormats[i].code) != 0;
+    for (const qk::FormatInfo& format : qk::kFormats) {
+        any = any || QKImage_requiredSize(width, height, format.code) != 0;
+    }
     if (!any) {
         return usage_error("formats", options.paths[0] + " is larger than 2 GiB for every format");
     }
     printf("%-6s %-10s %12s\n", "format", "code", "bytes");
-    for (int i = 0; i < kFormatCount; ++i) {
-        const uint64_t bytes = QKImage_requiredSize(width, height, kFormats[i].code);
-        const bool raw = QKImage_requiredSize(1, 1, kFormats[i].code) != 0;
-        printf("%-6s 0x%08x %12llu%s\n", kFormats[i].name, kFormats[i].code, static_cast<unsigned long long>(bytes),
+    for (const qk::FormatInfo& format : qk::kFormats) {
+        const uint64_t bytes = QKImage_requiredSize(width, height, format.code);
+        const bool raw = QKImage_requiredSize(1, 1, format.code) != 0;
+        printf("%-6s 0x%08x %12llu%s\n", format.name, format.code, static_cast<unsigned long long>(bytes),
                bytes != 0 ? "" : raw ? "  (too large: over 2 GiB)" : "  (encoded: no size rule)");
     }
     return 0;

@@ -4,6 +4,8 @@
 
 #include <algorithm>
 
+#include "image/format.h"
+
 const Command kCommands[] = {
     {"formats", cmd_formats, "WIDTHxHEIGHT", "byte size of a raw frame of every format at that size",
      "qkimage formats 4000x3000"},
@@ -82,10 +84,11 @@ void print_help(FILE* stream) {
         fprintf(stream, "      e.g. %s\n", command.example);
     }
     fprintf(stream, "\nformats (letter case ignored; the names after them are accepted too):\n");
-    for (int i = 0; i < kFormatCount; ++i) {
-        std::string aliases = kFormats[i].aliases;
+    for (const qk::FormatInfo& format : qk::kFormats) {
+        const FormatNote& note = format_note(format.code);
+        std::string aliases = note.aliases;
         std::replace(aliases.begin(), aliases.end(), ',', '/');
-        fprintf(stream, "  %-5s %-14s %s\n", kFormats[i].name, aliases.c_str(), kFormats[i].about);
+        fprintf(stream, "  %-5s %-14s %s\n", format.name, aliases.c_str(), note.about);
     }
     fprintf(stream, "\nA raw frame is the pixel bytes of one image without header.\n%s", kNotes);
 }

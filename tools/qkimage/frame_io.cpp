@@ -13,6 +13,7 @@
 
 #include "args.h"
 #include "commands.h"
+#include "image/format.h"
 
 namespace {
 
@@ -44,26 +45,11 @@ std::string shown(const std::string& path) { return path == "-" ? "standard inpu
 
 }  // namespace
 
-bool is_rgb(uint32_t format) {
-    return format == QK_FORMAT_RGBA || format == QK_FORMAT_BGRA || format == QK_FORMAT_ARGB ||
-           format == QK_FORMAT_ABGR || format == QK_FORMAT_RGB8 || format == QK_FORMAT_BGR8;
-}
+bool is_rgb(uint32_t format) { return qk::is_rgb_format(format); }
 
-bool needs_even_width(uint32_t format) {
-    switch (format) {
-        case QK_FORMAT_NV12:
-        case QK_FORMAT_NV21:
-        case QK_FORMAT_YV12:
-        case QK_FORMAT_YUVP:
-        case QK_FORMAT_YUYV:
-        case QK_FORMAT_YVYU: return true;
-        default: return false;
-    }
-}
+bool needs_even_width(uint32_t format) { return qk::chroma_pairs_columns(format); }
 
-bool needs_even_height(uint32_t format) {
-    return needs_even_width(format) && format != QK_FORMAT_YUYV && format != QK_FORMAT_YVYU;
-}
+bool needs_even_height(uint32_t format) { return qk::chroma_pairs_rows(format); }
 
 std::string describe(int32_t width, int32_t height, uint32_t format) {
     return std::to_string(width) + "x" + std::to_string(height) + " " + format_name(format);

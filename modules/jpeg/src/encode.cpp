@@ -105,7 +105,8 @@ void* encode_422(const uint8_t* pixels, int32_t width, int32_t height, uint32_t 
     Block scratch = qk::jpeg::allocate(lumaBytes + 2 * chromaBytes);
     if (!scratch) return nullptr;
     uint8_t* y = scratch.get();
-    qk::jpeg::split422(pixels, width, height, format == QK_FORMAT_YUYV, y, y + lumaBytes,
+    const qk::YuvLayout& layout = qk::yuv_layout(format);
+    qk::jpeg::split422(pixels, width, height, layout.uOffset < layout.vOffset, y, y + lumaBytes,
                        y + lumaBytes + chromaBytes);
     const uint8_t* planes[3] = {y, y + lumaBytes, y + lumaBytes + chromaBytes};
     const int strides[3] = {static_cast<int>(turbo.lumaWidth), static_cast<int>(turbo.chromaWidth),

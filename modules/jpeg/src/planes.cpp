@@ -2,7 +2,7 @@
 
 #include <string.h>
 
-#include "qkcore/qk_image.h"
+#include "image/format.h"
 
 namespace qk::jpeg {
 namespace {
@@ -31,16 +31,12 @@ Chroma420 chroma420(int32_t width, int32_t height, uint32_t format) {
     const size_t luma = static_cast<size_t>(width) * static_cast<size_t>(height);
     const size_t samples = static_cast<size_t>(width / 2);
     const size_t rows = static_cast<size_t>(height / 2);
-    // The planar formats' second plane starts a quarter of the luma plane
-    // after the first, as the library's chroma_start() has it; at odd sizes
-    // that leaves a gap after the first plane, never an overlap.
-    const size_t quarter = luma / 4;
-    switch (format) {
-        case QK_FORMAT_NV12: return {luma, luma + 1, 2, 2 * samples, samples, rows};
-        case QK_FORMAT_NV21: return {luma + 1, luma, 2, 2 * samples, samples, rows};
-        case QK_FORMAT_YV12: return {luma + quarter, luma, 1, samples, samples, rows};
-        default: return {luma, luma + quarter, 1, samples, samples, rows};  // YUVP
-    }
+    // The library's own placement, chroma right after luma; at odd sizes the
+    // planar formats' second plane leaves a gap after the first, never an
+    // overlap.
+    const ChromaStart start = chroma_start(format, luma, width, height);
+    const size_t step = static_cast<size_t>(yuv_layout(format).chromaStep);
+    return {start.u, start.v, step, step * samples, samples, rows};
 }
 
 void copy_plane(const uint8_t* src, size_t srcStride, uint8_t* dst, size_t dstStride, size_t width,
