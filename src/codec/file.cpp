@@ -13,6 +13,7 @@
 #include <string>
 
 #include "codec/codec.h"
+#include "image/checks.h"
 #include "image/format.h"
 #include "image/status.h"
 #include "platform/picture.h"
@@ -130,7 +131,7 @@ namespace {
 uint64_t raw_bytes_needed(const QKImage& image) {
     uint64_t needed = QKImage_size(&image);
     if (image.chromaOffset != 0 && qk::is_yuv420_format(image.format)) {
-        needed = std::max(needed, qk::yuv420_extent(image.chromaOffset, image.width, image.height));
+        needed = std::max(needed, qk::yuv420_extent(qk::chroma_base(image), image.width, image.height));
     }
     return needed;
 }

@@ -7,7 +7,7 @@
 #include <algorithm>
 
 #include "codec/codec.h"
-#include "image/format.h"
+#include "image/checks.h"
 #include "image/status.h"
 #include "platform/module.h"
 #include "platform/picture.h"

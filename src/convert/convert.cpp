@@ -4,6 +4,7 @@
 #include <string.h>
 
 #include "convert/kernels.h"
+#include "image/checks.h"
 #include "image/format.h"
 #include "image/status.h"
 #include "qkcore/qk_converter.h"
@@ -20,14 +21,6 @@ Family family_of(uint32_t format) {
     return Family::kOther;
 }
 
-// The 4:2:0 formats need an even width and height, the packed 4:2:2 formats
-// an even width.
-bool dimensions_fit(uint32_t format, int32_t width, int32_t height) {
-    if (qk::is_yuv420_format(format)) return width % 2 == 0 && height % 2 == 0;
-    if (qk::is_packed422_format(format)) return width % 2 == 0;
-    return true;
-}
-
 // Same format: one block, or luma and chroma separately when the two images
 // record different chroma offsets (0 and width x height name the same place,
 // but a block of the recorded size would then run past the picture) or the
@@ -35,12 +28,13 @@ bool dimensions_fit(uint32_t format, int32_t width, int32_t height) {
 // memmove, because converting an image into itself is a harmless no-op.
 void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copyLength) {
     if (qk::is_yuv420_format(src.format)) {
-        const uint64_t lumaBytes = static_cast<uint64_t>(src.width) * static_cast<uint64_t>(src.height);
+        const uint64_t lumaBytes = qk::yuv420_luma_bytes(src.width, src.height);
+        const uint64_t chromaBytes = qk::yuv420_chroma_bytes(src.width, src.height);
         const uint64_t srcBase = qk::chroma_base(src);
         const uint64_t dstBase = qk::chroma_base(dst);
-        if (src.chromaOffset != dst.chromaOffset || copyLength < dstBase + lumaBytes / 2) {
+        if (src.chromaOffset != dst.chromaOffset || copyLength < dstBase + chromaBytes) {
             memmove(dst.data, src.data, lumaBytes);
-            memmove(dst.data + dstBase, src.data + srcBase, lumaBytes / 2);
+            memmove(dst.data + dstBase, src.data + srcBase, chromaBytes);
             return;
         }
     }
@@ -57,15 +51,17 @@ int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
 
     const uint64_t needed = QKImage_requiredSize(src->width, src->height, dst->format);
     if (needed == 0) return QK_FAIL(QK_ERROR_INVALID_PARAM);
-    if (!dimensions_fit(src->format, src->width, src->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    if (!dimensions_fit(dst->format, dst->width, dst->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    // The 4:2:0 formats need an even width and height, the packed 4:2:2
+    // formats an even width.
+    if (!qk::on_chroma_grid(src->format, src->width, src->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    if (!qk::on_chroma_grid(dst->format, dst->width, dst->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
 
     const Family srcFamily = family_of(src->format);
     const Family dstFamily = family_of(dst->format);
     // The destination takes over the source's dimensions, which must suit its
     // format too: an RGB or GREY source of odd size cannot become 4:2:0 or
     // packed 4:2:2, nor a packed source of odd height 4:2:0.
-    if (srcFamily != Family::kOther && !dimensions_fit(dst->format, src->width, src->height)) {
+    if (srcFamily != Family::kOther && !qk::on_chroma_grid(dst->format, src->width, src->height)) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
 
@@ -75,7 +71,8 @@ int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
     // end inside the destination's buffer. The source must hold its whole
     // picture where it records its size.
     if (qk::is_yuv420_format(dst->format) &&
-        qk::yuv420_extent(dst->chromaOffset, src->width, src->height) > capacity) {
+        qk::yuv420_extent(qk::chroma_base(dst->chromaOffset, src->width, src->height), src->width, src->height) >
+            capacity) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
     if (!qk::buffer_holds_image(*src)) return QK_FAIL(QK_ERROR_INVALID_SIZE);

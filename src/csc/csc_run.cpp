@@ -2,8 +2,7 @@
 // libcsc.so, loaded for each call so that the library works without it.
 #include <stdint.h>
 
-#include <algorithm>
-
+#include "image/checks.h"
 #include "image/format.h"
 #include "image/status.h"
 #include "platform/module.h"
@@ -21,10 +20,8 @@ constexpr const char* kRoutines[] = {"csc_ARGB8888_to_YUV420SP_NEON", "csc_ARGB8
 
 // Whether the routine's writes, sized by the source, stay in the destination.
 bool destination_fits(const QKImage& src, const QKImage& dst) {
-    if (src.width < 1 || src.height < 1 || src.width % 2 != 0 || src.height % 2 != 0) return false;
-    const uint64_t lumaBytes = static_cast<uint64_t>(src.width) * static_cast<uint64_t>(src.height);
-    const uint64_t end = std::max(lumaBytes, qk::chroma_base(dst) + lumaBytes / 2);
-    return end <= QKImage_size(&dst);
+    if (src.width < 1 || src.height < 1 || !qk::on_chroma_grid(dst.format, src.width, src.height)) return false;
+    return qk::yuv420_extent(qk::chroma_base(dst), src.width, src.height) <= QKImage_size(&dst);
 }
 
 }  // namespace

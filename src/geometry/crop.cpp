@@ -1,6 +1,7 @@
 #include <stdint.h>
 
 #include "geometry/geometry.h"
+#include "image/checks.h"
 #include "image/format.h"
 #include "image/status.h"
 #include "qkcore/qk_image.h"
@@ -30,10 +31,12 @@ int32_t QKImage_crop(const QKImage* src, QKImage* dst, int32_t x, int32_t y) {
         return QK_OK;
     }
     if (!qk::is_yuv420_format(dst->format)) return QK_FAIL(QK_ERROR_UNSUPPORTED);
-    // One chroma sample covers 2x2 pixels: odd values are refused, never rounded.
-    if (x % 2 != 0 || y % 2 != 0) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    if (src->width % 2 != 0 || src->height % 2 != 0) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    if (width % 2 != 0 || height % 2 != 0) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    // One chroma sample covers 2x2 pixels: the corner and both images' sizes
+    // lie on that grid.
+    if (!qk::on_chroma_grid(dst->format, x, y) || !qk::on_chroma_grid(dst->format, src->width, src->height) ||
+        !qk::on_chroma_grid(dst->format, width, height)) {
+        return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    }
     qk::copy_region(*src, *dst, region);
     return QK_OK;
 }

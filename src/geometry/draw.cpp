@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "geometry/geometry.h"
+#include "image/checks.h"
 #include "image/format.h"
 #include "image/status.h"
 #include "qkcore/qk_image.h"
@@ -30,12 +31,12 @@ int32_t QKImage_drawImage(const QKImage* src, QKImage* dst, int32_t x, int32_t y
         return QK_OK;
     }
     if (qk::is_yuv420_format(src->format)) {
-        if (x % 2 != 0 || y % 2 != 0 || sw % 2 != 0 || sh % 2 != 0) {
+        if (!qk::on_chroma_grid(src->format, x, y) || !qk::on_chroma_grid(src->format, sw, sh)) {
             QK_LOG(QK_LOG_ERROR, "Unsupported dimensions for YUV420: %dx%d offset %d,%d", src->width, src->height, x,
                    y);
             return QK_FAIL(QK_ERROR_UNSUPPORTED);
         }
-        if (dw % 2 != 0 || dh % 2 != 0) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+        if (!qk::on_chroma_grid(src->format, dw, dh)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
     } else if (!qk::is_rgb_format(src->format)) {
         return QK_FAIL(QK_ERROR_UNSUPPORTED);
     }

@@ -47,13 +47,13 @@ void copy_region(const QKImage& src, QKImage& dst, const Region& region) {
     copy_block(src.data, sw, sx, sy, dst.data, dw, dx, dy, cols, lines, 1);
     const ChromaStart from = chroma_start(src);
     const ChromaStart to = chroma_start(dst);
-    if (src.format == QK_FORMAT_NV12 || src.format == QK_FORMAT_NV21) {
+    if (yuv_layout(src.format).chromaStep == 2) {
         // One plane of U,V pairs: rows of `width` bytes, pairs copied as they stand.
         copy_block(src.data + std::min(from.u, from.v), sw, sx, sy / 2, dst.data + std::min(to.u, to.v), dw, dx,
                    dy / 2, cols, lines / 2, 1);
         return;
     }
-    // YV12 and YUVP: a V and a U plane of half-width rows.
+    // Two planes, V and U, of half-width rows.
     copy_block(src.data + from.v, sw / 2, sx / 2, sy / 2, dst.data + to.v, dw / 2, dx / 2, dy / 2, cols / 2,
                lines / 2, 1);
     copy_block(src.data + from.u, sw / 2, sx / 2, sy / 2, dst.data + to.u, dw / 2, dx / 2, dy / 2, cols / 2,

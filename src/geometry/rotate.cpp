@@ -29,12 +29,8 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
     // The turned picture is written back over the whole buffer, so the buffer
     // must be exactly one picture: a larger one would keep stale bytes past
     // it, a smaller one cannot be read in full.
-    const uint64_t buffer_size = QKImage_size(image);
-    if (width < 1 || height < 1 ||
-        buffer_size != uint64_t{platform::kBitmapBytesPerPixel} * static_cast<uint64_t>(width) *
-                           static_cast<uint64_t>(height)) {
-        return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    }
+    const uint64_t picture_bytes = QKImage_requiredSize(width, height, image->format);
+    if (picture_bytes == 0 || QKImage_size(image) != picture_bytes) return QK_FAIL(QK_ERROR_INVALID_SIZE);
     // No turn: drawing onto a cleared bitmap and copying back would give the
     // same bytes.
     if (orient == 0) return QK_OK;

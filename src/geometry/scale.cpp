@@ -1,5 +1,6 @@
 #include <stdint.h>
 
+#include "image/checks.h"
 #include "image/status.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
@@ -8,11 +9,6 @@
 namespace {
 
 constexpr const char* kScale = "QKImage_scale";
-
-uint64_t rgba_bytes(const QKImage& image) {
-    return uint64_t{qk::platform::kBitmapBytesPerPixel} * static_cast<uint64_t>(image.width) *
-           static_cast<uint64_t>(image.height);
-}
 
 bool overlap(const uint8_t* a, uint64_t a_size, const uint8_t* b, uint64_t b_size) {
     const uintptr_t a0 = reinterpret_cast<uintptr_t>(a);
@@ -33,11 +29,10 @@ int32_t QKImage_scale(const QKImage* src, QKImage* dst) {
         return QK_FAIL(QK_ERROR_INVALID_PARAM);
     }
     // The source is read in full and the destination written in full: a
-    // recorded size below the picture is refused before anything is touched.
-    const uint64_t src_bytes = rgba_bytes(*src);
-    const uint64_t dst_bytes = rgba_bytes(*dst);
-    if (QKImage_size(src) < src_bytes) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    if ((dst->data != nullptr || dst->size != 0) && QKImage_size(dst) < dst_bytes) {
+    // buffer that does not hold its picture is refused before anything is
+    // touched.
+    if (!qk::buffer_holds_image(*src)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
+    if ((dst->data != nullptr || dst->size != 0) && !qk::buffer_holds_image(*dst)) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
     if (dst->data == nullptr) {
@@ -49,6 +44,8 @@ int32_t QKImage_scale(const QKImage* src, QKImage* dst) {
         }
     }
 
+    const uint64_t src_bytes = QKImage_requiredSize(src->width, src->height, src->format);
+    const uint64_t dst_bytes = QKImage_requiredSize(dst->width, dst->height, dst->format);
     const float scale_x = static_cast<float>(dst->width) / static_cast<float>(src->width);
     const float scale_y = static_cast<float>(dst->height) / static_cast<float>(src->height);
     qk::platform::Bitmap source;

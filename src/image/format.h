@@ -163,13 +163,13 @@ inline uint64_t chroma_base(const QKImage& image) {
     return chroma_base(image.chromaOffset, image.width, image.height);
 }
 
-// Bytes a 4:2:0 image of these (positive) dimensions reaches into its buffer:
-// its luma plane, and width x height / 2 bytes of chroma from the chroma base.
-inline uint64_t yuv420_extent(uint32_t chromaOffset, int32_t width, int32_t height) {
-    const uint64_t luma = static_cast<uint64_t>(width) * static_cast<uint64_t>(height);
-    const uint64_t chroma_end = chroma_base(chromaOffset, width, height) + luma / 2;
-    return chroma_end > luma ? chroma_end : luma;
+// Bytes of a 4:2:0 picture's luma plane, and of its chroma (a U and a V
+// sample for each 2x2 pixels, width x height / 2 bytes in all), for positive
+// dimensions.
+inline uint64_t yuv420_luma_bytes(int32_t width, int32_t height) {
+    return static_cast<uint64_t>(width) * static_cast<uint64_t>(height);
 }
+inline uint64_t yuv420_chroma_bytes(int32_t width, int32_t height) { return yuv420_luma_bytes(width, height) / 2; }
 
 // Where the first U and V samples of a YUV-family picture lie, from the
 // buffer start; for 4:2:0 from the given chroma base. GREY gives {0, 0}.
@@ -181,16 +181,6 @@ ChromaStart chroma_start(uint32_t format, uint64_t base, int32_t width, int32_t 
 inline ChromaStart chroma_start(const QKImage& image) {
     return chroma_start(image.format, chroma_base(image), image.width, image.height);
 }
-
-// True when the image's buffer holds the whole picture that its width,
-// height and format describe. A recorded size is checked against everything
-// the picture occupies, 4:2:0 chroma at a separate chromaOffset included;
-// without a recorded size the rule size is all there is to go by, and a
-// chromaOffset past the luma plane is the caller's promise. A picture too
-// large for any byte count never fits. Images with nothing to read (a
-// dimension below 1, encoded or unknown formats) pass: the operations refuse
-// them on their own terms.
-bool buffer_holds_image(const QKImage& image);
 
 }  // namespace qk
 

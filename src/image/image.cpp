@@ -116,9 +116,8 @@ QKImage* QKImage_clone(const QKImage* source) {
         memset(clone->data + to + present, 0, length - present);
     };
     if (source->chromaOffset != 0 && qk::is_yuv420_format(source->format)) {
-        const uint64_t luma = static_cast<uint64_t>(source->width) * static_cast<uint64_t>(source->height);
-        copy(0, 0, luma);
-        copy(luma, source->chromaOffset, luma / 2);
+        copy(0, 0, qk::yuv420_luma_bytes(source->width, source->height));
+        copy(qk::chroma_base(*clone), qk::chroma_base(*source), qk::yuv420_chroma_bytes(source->width, source->height));
         return clone;
     }
     copy(0, 0, clone->size);
