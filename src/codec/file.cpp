@@ -15,11 +15,11 @@
 #include "codec/codec.h"
 #include "image/checks.h"
 #include "image/format.h"
-#include "image/status.h"
 #include "platform/picture.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
 #include "util/log.h"
+#include "util/status.h"
 
 void save_to_file(const char* path, unsigned char* data, unsigned int size) {
     QK_LOG(QK_LOG_DEBUG, "opening file");

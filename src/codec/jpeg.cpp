@@ -8,12 +8,12 @@
 
 #include "codec/codec.h"
 #include "image/checks.h"
-#include "image/status.h"
 #include "platform/module.h"
 #include "platform/picture.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
 #include "util/log.h"
+#include "util/status.h"
 #include "veljpeginterface.h"
 
 QKImage* QKImage_encodeToJpeg(const QKImage* image, int32_t quality) {

@@ -6,10 +6,10 @@
 #include "convert/kernels.h"
 #include "image/checks.h"
 #include "image/format.h"
-#include "image/status.h"
 #include "qkcore/qk_converter.h"
 #include "qkcore/qk_image.h"
 #include "util/log.h"
+#include "util/status.h"
 
 namespace {
 

@@ -4,10 +4,10 @@
 #include <atomic>
 #include <new>
 
-#include "image/status.h"
 #include "platform/module.h"
 #include "qkcore/qk_converter.h"
 #include "util/log.h"
+#include "util/status.h"
 
 struct QKConverter {
     qk::platform::Module module;  // one reference per handle: handles are independent

@@ -4,9 +4,9 @@
 
 #include "image/checks.h"
 #include "image/format.h"
-#include "image/status.h"
 #include "platform/module.h"
 #include "qkcore/qk_converter.h"
+#include "util/status.h"
 
 namespace {
 

@@ -3,8 +3,8 @@
 #include "geometry/geometry.h"
 #include "image/checks.h"
 #include "image/format.h"
-#include "image/status.h"
 #include "qkcore/qk_image.h"
+#include "util/status.h"
 
 int32_t QKImage_crop(const QKImage* src, QKImage* dst, int32_t x, int32_t y) {
     if (src == nullptr || dst == nullptr) return QK_FAIL(QK_ERROR_NULL_PARAM);

@@ -5,9 +5,9 @@
 #include "geometry/geometry.h"
 #include "image/checks.h"
 #include "image/format.h"
-#include "image/status.h"
 #include "qkcore/qk_image.h"
 #include "util/log.h"
+#include "util/status.h"
 
 namespace {
 

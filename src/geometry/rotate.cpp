@@ -1,10 +1,10 @@
 #include <stdint.h>
 
 #include "geometry/geometry.h"
-#include "image/status.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
 #include "util/log.h"
+#include "util/status.h"
 
 namespace qk {
 

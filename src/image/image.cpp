@@ -6,9 +6,9 @@
 #include <new>
 
 #include "image/format.h"
-#include "image/status.h"
 #include "platform/memory.h"
 #include "qkcore/qk_image.h"
+#include "util/status.h"
 
 namespace {
 

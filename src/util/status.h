@@ -1,7 +1,7 @@
 // Failure reports: the one level-4 line a failing operation writes where it
 // detects the failure, naming the status and the source place.
-#ifndef QKCORE_SRC_IMAGE_STATUS_H
-#define QKCORE_SRC_IMAGE_STATUS_H
+#ifndef QKCORE_SRC_UTIL_STATUS_H
+#define QKCORE_SRC_UTIL_STATUS_H
 
 #include <stdint.h>
 
@@ -21,4 +21,4 @@ int32_t report_failure(int32_t status, const char* file, int line);
 // Reports a failure detected here and yields its status: `return QK_FAIL(x);`
 #define QK_FAIL(status) ::qk::report_failure((status), __FILE__, __LINE__)
 
-#endif  // QKCORE_SRC_IMAGE_STATUS_H
+#endif  // QKCORE_SRC_UTIL_STATUS_H

@@ -1,4 +1,4 @@
-#include "image/status.h"
+#include "util/status.h"
 
 #include "util/log.h"
 
