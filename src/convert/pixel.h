@@ -1,6 +1,6 @@
 // Per-pixel colour arithmetic shared by the row kernels: full-range BT.601,
-// fixed point from RGB to YUV, double precision (or its exact integer
-// equivalent) from YUV to RGB.
+// fixed point from RGB to YUV, double precision from YUV to RGB (the faster
+// kernels' exact integer equivalent lives with them).
 #ifndef QKCORE_SRC_CONVERT_PIXEL_H
 #define QKCORE_SRC_CONVERT_PIXEL_H
 
@@ -40,14 +40,6 @@ inline void yuv_pixel_double(int luma, const ChromaProducts& c, uint8_t* r, uint
     *g = double_channel((y - c.gu) - c.gv);
     *b = double_channel(y + c.bu);
 }
-
-// YUV to RGB in integers. For every (Y, U, V) the double form above equals
-// clamp(Y + offset) with per-pair offsets floor(1.402 v), floor(-(0.34414 u +
-// 0.71414 v)), floor(1.772 u) (u = U - 128, v = V - 128), except at one pair:
-// there the exact green offset is the integer -37, and the double steps land
-// just below it for some lumas and on it for others. Its pixels take the
-// double path. The tests prove the equivalence over all 2^24 inputs.
-inline bool chroma_needs_double_path(int u_byte, int v_byte) { return u_byte == 28 && v_byte == 228; }
 
 }  // namespace qk
 

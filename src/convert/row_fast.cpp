@@ -99,10 +99,19 @@ int chroma_step_index(int step) {
 
 // YUV to RGB -----------------------------------------------------------------
 
-// Integer chroma offsets (see pixel.h): red from V and blue from U rounded
-// down, and the two exact terms of the green numerator, whose sum is divided
-// once per pair (splitting the floor over the two terms would be off by one
-// where the sum is a multiple of 100000).
+// YUV to RGB in integers. For every (Y, U, V) the double form of pixel.h
+// equals clamp(Y + offset) with per-pair offsets floor(1.402 v),
+// floor(-(0.34414 u + 0.71414 v)), floor(1.772 u) (u = U - 128, v = V - 128),
+// except at one pair: there the exact green offset is the integer -37, and
+// the double steps land just below it for some lumas and on it for others.
+// Its pixels take the double path. The tests prove the equivalence over all
+// 2^24 inputs.
+inline bool chroma_needs_double_path(int u_byte, int v_byte) { return u_byte == 28 && v_byte == 228; }
+
+// The integer chroma offsets: red from V and blue from U rounded down, and
+// the two exact terms of the green numerator, whose sum is divided once per
+// pair (splitting the floor over the two terms would be off by one where the
+// sum is a multiple of 100000).
 struct IntegerChroma {
     int16_t red[256];
     int16_t blue[256];

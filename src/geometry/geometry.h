@@ -1,5 +1,4 @@
-// Internal routines shared by the geometry operations (rotation, scaling,
-// cropping, drawing).
+// Internal routines shared by the geometry operations (cropping, drawing).
 #ifndef QKCORE_SRC_GEOMETRY_GEOMETRY_H
 #define QKCORE_SRC_GEOMETRY_GEOMETRY_H
 
@@ -8,11 +7,6 @@
 #include "qkcore/qk_image.h"
 
 namespace qk {
-
-// Turns an RGBA image that has a buffer in place by `angle` degrees (a
-// multiple of 90); QKImage_rotate's RGBA path. QK_OK, or a failure status
-// with its report and the image unchanged.
-int32_t rotate_rgba(QKImage* image, int32_t angle);
 
 // A rectangle of `cols` x `lines` pixels at (src_x, src_y) of one image and
 // (dst_x, dst_y) of another.

@@ -1,13 +1,15 @@
 #include <stdint.h>
 
-#include "geometry/geometry.h"
 #include "platform/raster.h"
 #include "qkcore/qk_image.h"
 #include "util/log.h"
 #include "util/status.h"
 
-namespace qk {
+namespace {
 
+// Turns an RGBA image that has a buffer in place by `angle` degrees (a
+// multiple of 90); QKImage_rotate's RGBA path. QK_OK, or a failure status
+// with its report and the image unchanged.
 int32_t rotate_rgba(QKImage* image, int32_t angle) {
     const int32_t width = image->width;
     const int32_t height = image->height;
@@ -35,13 +37,13 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
     // same bytes.
     if (orient == 0) return QK_OK;
 
-    platform::Bitmap picture;
+    qk::platform::Bitmap picture;
     picture.borrow(image->data, width, height);
     // The raster layer turns clockwise: the library's counter-clockwise angle
     // is negated. The pixels are those of drawing onto a cleared bitmap, so
     // the uncovered row or column ends up transparent black and translucent
     // pixels arrive unchanged.
-    if (!platform::turn_in_place(picture, -(angle / 90), pivot_x, pivot_y)) {
+    if (!qk::platform::turn_in_place(picture, -(angle / 90), pivot_x, pivot_y)) {
         return QK_FAIL(QK_ERROR_ALLOC_FAILED);
     }
     image->width = out_width;
@@ -49,11 +51,7 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
     return QK_OK;
 }
 
-}  // namespace qk
-
 // ---- Images in other formats: turned through a temporary RGBA copy ----
-
-namespace {
 
 // Converts to a temporary RGBA image, turns it, and converts back into the
 // caller's buffer, stopping at the first failure. The temporary owns only the
@@ -66,7 +64,7 @@ int32_t rotate_through_rgba(QKImage* image, int32_t angle) {
     const int32_t allocated = QKImage_allocate(&rgba);
     if (allocated < 0) return allocated;
     int32_t status = QKImage_convert(image, &rgba);
-    if (status == QK_OK) status = qk::rotate_rgba(&rgba, angle);
+    if (status == QK_OK) status = rotate_rgba(&rgba, angle);
     if (status == QK_OK) status = QKImage_convert(&rgba, image);
     return status;
 }
@@ -79,7 +77,7 @@ int32_t QKImage_rotate(QKImage* image, int32_t angle) {
     if (image == nullptr || image->data == nullptr) return QK_FAIL(QK_ERROR_NULL_PARAM);
     if (angle % 90 != 0) return QK_FAIL(QK_ERROR_INVALID_PARAM);
     if (QKImage_size(image) == 0) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    if (image->format == QK_FORMAT_RGBA) return qk::rotate_rgba(image, angle);
+    if (image->format == QK_FORMAT_RGBA) return rotate_rgba(image, angle);
     QK_LOG(QK_LOG_WARN,
            "Rotation is supported on RGBA images only for now: using temporary RGBA copy of this %dx%d '%4.4s' image",
            image->width, image->height, QK_FOURCC_STR(image->format));

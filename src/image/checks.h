@@ -16,8 +16,7 @@ namespace qk {
 // both even for 4:2:0, x even for packed 4:2:2, anything for other formats.
 // Odd values are refused, never rounded.
 inline bool on_chroma_grid(uint32_t format, int64_t x, int64_t y) {
-    const YuvLayout& layout = yuv_layout(format);
-    return (layout.chromaStep == 0 || x % 2 == 0) && (!layout.subsampledRows || y % 2 == 0);
+    return (x % 2 == 0 || !chroma_pairs_columns(format)) && (y % 2 == 0 || !chroma_pairs_rows(format));
 }
 
 // Bytes a 4:2:0 picture of these (positive) dimensions reaches into its

@@ -8,14 +8,14 @@
 QKLogFn HX_LogMsg = AndroidLogMsg;
 
 namespace qk {
+namespace {
 
+// The level tag printed on standard output ("[V]" for out-of-range levels).
 const char* log_level_tag(int level) {
     static const char* const kTags[] = {"[V]", "[D]", "[I]", "[W]", "[E]"};
     unsigned index = static_cast<unsigned>(level);
     return kTags[index > 4 ? 0 : index];
 }
-
-namespace {
 
 // "<tag> <message>\n" as one locked unit, so lines of concurrent callers do
 // not interleave within a line. Returns the result of writing the newline.

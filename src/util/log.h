@@ -11,9 +11,6 @@ namespace qk {
 // arguments, which the hook's (int, ...) signature cannot express.
 [[gnu::format(printf, 1, 2)]] inline void check_log_format(const char*, ...) {}
 
-// The level tag printed on standard output ("[V]" for out-of-range levels).
-const char* log_level_tag(int level);
-
 }  // namespace qk
 
 #define QK_LOG(level, ...)                                \

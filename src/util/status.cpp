@@ -3,7 +3,10 @@
 #include "util/log.h"
 
 namespace qk {
+namespace {
 
+// "QK_ERROR_NULL_PARAM" and so on; "QK_OK" for 0, "QK_ERROR_UNKNOWN" for
+// values that are not status codes.
 const char* status_name(int32_t status) {
     switch (status) {
         case QK_OK: return "QK_OK";
@@ -18,6 +21,8 @@ const char* status_name(int32_t status) {
         default: return "QK_ERROR_UNKNOWN";
     }
 }
+
+}  // namespace
 
 int32_t report_failure(int32_t status, const char* file, int line) {
     QK_LOG(QK_LOG_ERROR, "%s (%d): %s:%d", status_name(status), status, file, line);

@@ -9,11 +9,9 @@
 
 namespace qk {
 
-// "QK_ERROR_NULL_PARAM" and so on; "QK_OK" for 0, "QK_ERROR_UNKNOWN" for
-// values that are not status codes.
-const char* status_name(int32_t status);
-
-// Writes "<name> (<value>): <file>:<line>" at level 4 and returns status.
+// Writes "<name> (<value>): <file>:<line>" at level 4, the name as in
+// "QK_ERROR_INVALID_SIZE" ("QK_ERROR_UNKNOWN" for values that are not status
+// codes), and returns status.
 int32_t report_failure(int32_t status, const char* file, int line);
 
 }  // namespace qk
