@@ -9,7 +9,6 @@
 #include <utility>
 
 #include "bench_util.h"
-#include "platform/raster.h"
 #include "qkcore/qk_image.h"
 
 namespace {
@@ -48,25 +47,6 @@ void BM_Rotate(benchmark::State& state, uint32_t format, int32_t angle) {
     }
     return true;
 }();
-
-// The raster layer's turned drawing alone, blending onto a bitmap that
-// already exists. The library's angle 90 is three clockwise quarter turns
-// about (W/2, W/2); its angle 270 one about (H/2, H/2).
-void BM_RasterQuarterTurnDraw(benchmark::State& state, int quarter_turns, int32_t pivot) {
-    QKImage* image = make_frame(kWidth, kHeight, QK_FORMAT_RGBA);
-    qk::platform::Bitmap source, target;
-    source.borrow(image->data, kWidth, kHeight);
-    target.allocate(kHeight, kWidth, /*cleared=*/true);
-    for (auto _ : state) {
-        qk::platform::draw_turned(source, quarter_turns, pivot, pivot, target);
-        benchmark::DoNotOptimize(target.pixels());
-        benchmark::ClobberMemory();
-    }
-    set_rates(state, int64_t{kWidth} * kHeight);
-    QKImage_destroy(image);
-}
-BENCHMARK_CAPTURE(BM_RasterQuarterTurnDraw, angle_90, 3, kWidth / 2)->Unit(benchmark::kMillisecond);
-BENCHMARK_CAPTURE(BM_RasterQuarterTurnDraw, angle_270, 1, kHeight / 2)->Unit(benchmark::kMillisecond);
 
 // The destination's buffer exists before timing: the allocation is the
 // caller's, not the resampling's.

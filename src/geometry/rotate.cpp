@@ -33,16 +33,14 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
     // it, a smaller one cannot be read in full.
     const uint64_t picture_bytes = QKImage_requiredSize(width, height, image->format);
     if (picture_bytes == 0 || QKImage_size(image) != picture_bytes) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    // No turn: drawing onto a cleared bitmap and copying back would give the
-    // same bytes.
+    // No turn: the bytes stay as they are.
     if (orient == 0) return QK_OK;
 
     qk::platform::Bitmap picture;
     picture.borrow(image->data, width, height);
     // The raster layer turns clockwise: the library's counter-clockwise angle
-    // is negated. The pixels are those of drawing onto a cleared bitmap, so
-    // the uncovered row or column ends up transparent black and translucent
-    // pixels arrive unchanged.
+    // is negated. Pixels are copied as they are, translucent ones included;
+    // the uncovered row or column ends up transparent black.
     if (!qk::platform::turn_in_place(picture, -(angle / 90), pivot_x, pivot_y)) {
         return QK_FAIL(QK_ERROR_ALLOC_FAILED);
     }

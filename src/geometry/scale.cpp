@@ -52,14 +52,13 @@ int32_t QKImage_scale(const QKImage* src, QKImage* dst) {
     source.borrow(src->data, src->width, src->height);
     // Resampling goes straight into the destination's buffer, unless that
     // buffer shares memory with the source: then into a bitmap of its own,
-    // copied over afterwards.
+    // copied over afterwards. It writes every pixel: nothing to clear first.
     const bool shared = overlap(src->data, src_bytes, dst->data, dst_bytes);
     qk::platform::Bitmap output;
     if (shared) {
-        if (!output.allocate(dst->width, dst->height, /*cleared=*/true)) return QK_FAIL(QK_ERROR_ALLOC_FAILED);
+        if (!output.allocate(dst->width, dst->height, /*cleared=*/false)) return QK_FAIL(QK_ERROR_ALLOC_FAILED);
     } else {
         output.borrow(dst->data, dst->width, dst->height);
-        output.clear();
     }
     qk::platform::draw_scaled(source, scale_x, scale_y, output);
     if (shared) output.copy_to(dst->data, dst_bytes);

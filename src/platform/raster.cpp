@@ -16,50 +16,9 @@ namespace {
 
 constexpr uint64_t kMaxBitmapBytes = INT32_MAX;
 
-// x / 255 rounded to nearest, exact for x in [0, 255 * 255].
-inline unsigned div255(unsigned x) {
-    x += 128;
-    return (x + (x >> 8)) >> 8;
-}
-
-// Premultiplied source-over: result = src + dst x (255 - src alpha) / 255.
-// An opaque source pixel, or a transparent-black target pixel, is a plain
-// copy: the common cases stay as fast as a copy.
-inline void blend_pixel(uint8_t* dst, const uint8_t* src) {
-    const unsigned alpha = src[3];
-    if (alpha != 255) {
-        uint32_t existing;
-        memcpy(&existing, dst, sizeof(existing));
-        if (existing != 0) {
-            const unsigned keep = 255 - alpha;
-            for (int i = 0; i < kBitmapBytesPerPixel; ++i) {
-                // Colour bytes above alpha are not premultiplied; saturate them.
-                const unsigned value = src[i] + div255(dst[i] * keep);
-                dst[i] = static_cast<uint8_t>(value > 255 ? 255 : value);
-            }
-            return;
-        }
-    }
-    memcpy(dst, src, kBitmapBytesPerPixel);
-}
-
-// Blends `count` source pixels, `step` bytes apart, onto consecutive pixels.
-inline void blend_run(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int64_t count) {
-    for (int64_t i = 0; i < count; ++i) blend_pixel(dst + i * kBitmapBytesPerPixel, src + i * step);
-}
-
 // Copies `count` source pixels, `step` bytes apart, onto consecutive pixels.
 inline void copy_run(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int64_t count) {
     for (int64_t i = 0; i < count; ++i) memcpy(dst + i * kBitmapBytesPerPixel, src + i * step, kBitmapBytesPerPixel);
-}
-
-template <bool kBlend>
-inline void put_run(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int64_t count) {
-    if constexpr (kBlend) {
-        blend_run(dst, src, step, count);
-    } else {
-        copy_run(dst, src, step, count);
-    }
 }
 
 // Four pixels as one vector (GCC and Clang vector extensions: SSE2 on x86,
@@ -72,20 +31,10 @@ inline Lanes load_lanes(const uint8_t* p) {
     return v;
 }
 
-// A pixel value with only its alpha byte set, whatever the byte order.
-inline uint32_t alpha_mask() {
-    const uint8_t bytes[kBitmapBytesPerPixel] = {0, 0, 0, 0xff};
-    uint32_t mask;
-    memcpy(&mask, bytes, sizeof(mask));
-    return mask;
-}
-
 // Turns a 4x4 block: target pixel (c + j, r + i), at dst + i rows + j
 // pixels, shows the source pixel at src + i * step_r + j * step_c, step_r
-// being one pixel forwards or backwards. Copied, the block is transposed four
-// pixels at a time; blended, so is an opaque one, and any other goes pixel by
-// pixel.
-template <bool kBlend>
+// being one pixel forwards or backwards. The block is transposed four pixels
+// at a time.
 inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, ptrdiff_t step_c, ptrdiff_t step_r) {
     const bool backwards = step_r < 0;
     const uint8_t* first = backwards ? src + 3 * step_r : src;
@@ -93,14 +42,6 @@ inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, p
     Lanes v1 = load_lanes(first + step_c);
     Lanes v2 = load_lanes(first + 2 * step_c);
     Lanes v3 = load_lanes(first + 3 * step_c);
-    if constexpr (kBlend) {
-        const Lanes all = v0 & v1 & v2 & v3;
-        const uint32_t mask = alpha_mask();
-        if ((all[0] & all[1] & all[2] & all[3] & mask) != mask) {
-            for (int i = 0; i < 4; ++i) blend_run(dst + i * dst_row_bytes, src + i * step_r, step_c, 4);
-            return;
-        }
-    }
     if (backwards) {
         v0 = __builtin_shufflevector(v0, v0, 3, 2, 1, 0);
         v1 = __builtin_shufflevector(v1, v1, 3, 2, 1, 0);
@@ -184,9 +125,8 @@ TargetView whole_target(Bitmap& bitmap) {
     return {bitmap.pixels(), bitmap.row_bytes(), bitmap.width(), 0, bitmap.height()};
 }
 
-// Draws the turn of `source` onto `target` (copies, or blends source-over)
-// and returns the rectangle of target pixels it covered.
-template <bool kBlend>
+// Draws the turn of `source` onto `target`, pixels copied as they are, and
+// returns the rectangle of target pixels it covered.
 Rect draw_turn(const TurnMap& m, const SourceView& source, const TargetView& target) {
     // Each source coordinate follows one target coordinate, so the covered
     // target pixels form a rectangle.
@@ -204,8 +144,7 @@ Rect draw_turn(const TurnMap& m, const SourceView& source, const TargetView& tar
     };
     if (m.xc != 0) {  // no turn or a half turn: source rows run along target rows
         for (int64_t r = rect.rows.lo; r < rect.rows.hi; ++r) {
-            put_run<kBlend>(target.at(rect.cols.lo, r), source_at(rect.cols.lo, r), step_c,
-                            rect.cols.hi - rect.cols.lo);
+            copy_run(target.at(rect.cols.lo, r), source_at(rect.cols.lo, r), step_c, rect.cols.hi - rect.cols.lo);
         }
         return rect;
     }
@@ -222,15 +161,15 @@ Rect draw_turn(const TurnMap& m, const SourceView& source, const TargetView& tar
             for (; r + 4 <= r1; r += 4) {
                 int64_t c = c0;
                 for (; c + 4 <= c1; c += 4) {
-                    turn_block<kBlend>(target.at(c, r), target.row_bytes, source_at(c, r), step_c, step_r);
+                    turn_block(target.at(c, r), target.row_bytes, source_at(c, r), step_c, step_r);
                 }
                 // The tail's source address is formed only when there is a
                 // tail: past the last column it may lie outside the source.
                 for (int64_t i = 0; c < c1 && i < 4; ++i) {
-                    put_run<kBlend>(target.at(c, r + i), source_at(c, r + i), step_c, c1 - c);
+                    copy_run(target.at(c, r + i), source_at(c, r + i), step_c, c1 - c);
                 }
             }
-            for (; r < r1; ++r) put_run<kBlend>(target.at(c0, r), source_at(c0, r), step_c, c1 - c0);
+            for (; r < r1; ++r) copy_run(target.at(c0, r), source_at(c0, r), step_c, c1 - c0);
         }
     }
     return rect;
@@ -311,19 +250,19 @@ void Bitmap::release() {
     owned_ = false;
 }
 
-void Bitmap::clear() {
-    if (pixels_ != nullptr) memset(pixels_, 0, byte_count());
+bool Bitmap::reshape(int32_t width, int32_t height) {
+    if (pixels_ == nullptr || width < 1 || height < 1 || int64_t{width} * height != int64_t{width_} * height_) {
+        return false;
+    }
+    width_ = width;
+    height_ = height;
+    return true;
 }
 
 bool Bitmap::copy_to(void* out, uint64_t capacity) const {
     if (pixels_ == nullptr || out == nullptr || capacity < byte_count()) return false;
     memcpy(out, pixels_, byte_count());
     return true;
-}
-
-void draw_turned(const Bitmap& source, int quarter_turns, int32_t pivot_x, int32_t pivot_y, Bitmap& target) {
-    if (!source.has_pixels() || !target.has_pixels()) return;
-    draw_turn<true>(turn_map(quarter_turns, pivot_x, pivot_y), whole_source(source), whole_target(target));
 }
 
 bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t pivot_y) {
@@ -342,8 +281,7 @@ bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t p
     const int64_t top = turned_height / 2;
     Bitmap bottom;
     if (!bottom.allocate(turned_width, static_cast<int32_t>(turned_height - top), /*cleared=*/true)) return false;
-    draw_turn<false>(m, whole_source(bitmap),
-                     TargetView{bottom.pixels(), bottom.row_bytes(), turned_width, top, turned_height});
+    draw_turn(m, whole_source(bitmap), TargetView{bottom.pixels(), bottom.row_bytes(), turned_width, top, turned_height});
 
     // The top rows show source columns x0 + xr * r, r in [0, top): at most
     // `top` of them, so top + kept <= width and the two never meet.
@@ -360,11 +298,9 @@ bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t p
         memmove(kept + static_cast<size_t>(y) * kept_row_bytes, columns, kept_row_bytes);
     }
     const TargetView top_rows{bitmap.pixels(), bottom.row_bytes(), turned_width, 0, top};
-    clear_outside(top_rows, draw_turn<false>(m, SourceView{kept, kept_row_bytes, lo, hi, height}, top_rows));
+    clear_outside(top_rows, draw_turn(m, SourceView{kept, kept_row_bytes, lo, hi, height}, top_rows));
     memcpy(top_rows.at(0, top), bottom.pixels(), bottom.byte_count());
-    bitmap.width_ = turned_width;
-    bitmap.height_ = turned_height;
-    return true;
+    return bitmap.reshape(turned_width, turned_height);
 }
 
 void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& target) {
@@ -391,7 +327,9 @@ void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& tar
         for (int32_t r = 0; r < target.height(); ++r) {
             const uint8_t* src = source.row(source_index(r, scale_y, source.height()));
             uint8_t* dst = target.row(r) + c0 * kBitmapBytesPerPixel;
-            for (int64_t c = 0; c < count; ++c) blend_pixel(dst + c * kBitmapBytesPerPixel, src + column_offset[c]);
+            for (int64_t c = 0; c < count; ++c) {
+                memcpy(dst + c * kBitmapBytesPerPixel, src + column_offset[c], kBitmapBytesPerPixel);
+            }
         }
     }
 }

@@ -1,8 +1,7 @@
-// Our raster layer: RGBA bitmaps and the two ways geometry draws one bitmap
-// onto another (a turn by quarter turns about a pivot, and nearest-pixel
-// scaling). Pixels are 4 bytes, R G B A, premultiplied in meaning; nothing
-// here converts them. Drawing blends source-over onto the target, so onto a
-// cleared target every pixel arrives unchanged.
+// Our raster layer: RGBA bitmaps and the two ways geometry moves their
+// pixels (a turn in place by quarter turns about a pivot, and nearest-pixel
+// scaling onto another bitmap). Pixels are 4 bytes, R G B A, copied as they
+// are: nothing here converts or blends them.
 //
 // The picture decoder and the PNG encoder of file loading and saving belong
 // here as well, working on these same bitmaps.
@@ -48,38 +47,33 @@ public:
     uint8_t* row(int32_t y) { return pixels_ + static_cast<size_t>(y) * row_bytes(); }
     const uint8_t* row(int32_t y) const { return pixels_ + static_cast<size_t>(y) * row_bytes(); }
 
-    // Every pixel becomes transparent black.
-    void clear();
+    // Takes the same pixels as width x height, as a quarter turn leaves
+    // them; false, and nothing changes, when the pixel count would differ.
+    bool reshape(int32_t width, int32_t height);
     // Copies all pixels to `out` when `capacity` bytes hold them; otherwise
     // copies nothing and returns false.
     bool copy_to(void* out, uint64_t capacity) const;
 
 private:
-    friend bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t pivot_y);
-
     uint8_t* pixels_ = nullptr;
     int32_t width_ = 0;
     int32_t height_ = 0;
     bool owned_ = false;
 };
 
-// Draws `source` turned clockwise (y pointing down) by quarter_turns x 90
-// degrees about the integer point (pivot_x, pivot_y): source point p lands
-// at R(p - pivot) + pivot. Any integer number of turns, negative included.
-// Target pixels that no source pixel covers are left as they are.
-void draw_turned(const Bitmap& source, int quarter_turns, int32_t pivot_x, int32_t pivot_y, Bitmap& target);
-
-// Turns the bitmap by quarter_turns x 90 degrees about the integer pivot in
-// place; after an odd number of turns it is height wide and width high. The
-// pixels are those of drawing it turned onto a cleared bitmap of that size;
-// a quarter turn takes memory for half of one more. False, and the bitmap
+// Turns the bitmap in place clockwise (y pointing down) by quarter_turns x
+// 90 degrees about the integer point (pivot_x, pivot_y): source point p
+// lands at R(p - pivot) + pivot. Any integer number of turns, negative
+// included; after an odd number it is height wide and width high. Pixels
+// that no source pixel covers become transparent black. A quarter turn
+// takes memory for half of one more bitmap. False, and the bitmap
 // unchanged, when it has no pixels or that memory cannot be had.
 bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t pivot_y);
 
-// Draws `source` scaled by the factors: target pixel (c, r) takes the source
-// pixel under its centre mapped back, ((c + 0.5) / scale_x, (r + 0.5) /
-// scale_y), clamped into the source. Factors must be positive (otherwise
-// nothing is drawn).
+// Draws `source` scaled by the factors over the whole target: target pixel
+// (c, r) takes the source pixel under its centre mapped back,
+// ((c + 0.5) / scale_x, (r + 0.5) / scale_y), clamped into the source.
+// Factors must be positive (otherwise nothing is drawn).
 void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& target);
 
 }  // namespace platform
