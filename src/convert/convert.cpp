@@ -26,19 +26,19 @@ Family family_of(uint32_t format) {
 // but a block of the recorded size would then run past the picture) or the
 // block would miss the chroma.
 // memmove, because converting an image into itself is a harmless no-op.
-void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copyLength) {
+void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copy_length) {
     if (qk::is_yuv420_format(src.format)) {
-        const uint64_t lumaBytes = qk::yuv420_luma_bytes(src.width, src.height);
-        const uint64_t chromaBytes = qk::yuv420_chroma_bytes(src.width, src.height);
-        const uint64_t srcBase = qk::chroma_base(src);
-        const uint64_t dstBase = qk::chroma_base(dst);
-        if (src.chromaOffset != dst.chromaOffset || copyLength < dstBase + chromaBytes) {
-            memmove(dst.data, src.data, lumaBytes);
-            memmove(dst.data + dstBase, src.data + srcBase, chromaBytes);
+        const uint64_t luma_bytes = qk::yuv420_luma_bytes(src.width, src.height);
+        const uint64_t chroma_bytes = qk::yuv420_chroma_bytes(src.width, src.height);
+        const uint64_t src_base = qk::chroma_base(src);
+        const uint64_t dst_base = qk::chroma_base(dst);
+        if (src.chromaOffset != dst.chromaOffset || copy_length < dst_base + chroma_bytes) {
+            memmove(dst.data, src.data, luma_bytes);
+            memmove(dst.data + dst_base, src.data + src_base, chroma_bytes);
             return;
         }
     }
-    memmove(dst.data, src.data, copyLength);
+    memmove(dst.data, src.data, copy_length);
 }
 
 }  // namespace
@@ -56,12 +56,12 @@ int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
     if (!qk::on_chroma_grid(src->format, src->width, src->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
     if (!qk::on_chroma_grid(dst->format, dst->width, dst->height)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
 
-    const Family srcFamily = family_of(src->format);
-    const Family dstFamily = family_of(dst->format);
+    const Family src_family = family_of(src->format);
+    const Family dst_family = family_of(dst->format);
     // The destination takes over the source's dimensions, which must suit its
     // format too: an RGB or GREY source of odd size cannot become 4:2:0 or
     // packed 4:2:2, nor a packed source of odd height 4:2:0.
-    if (srcFamily != Family::kOther && !qk::on_chroma_grid(dst->format, src->width, src->height)) {
+    if (src_family != Family::kOther && !qk::on_chroma_grid(dst->format, src->width, src->height)) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
 
@@ -76,20 +76,20 @@ int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
         return QK_FAIL(QK_ERROR_INVALID_SIZE);
     }
     if (!qk::buffer_holds_image(*src)) return QK_FAIL(QK_ERROR_INVALID_SIZE);
-    const uint64_t copyLength = (dst->size != 0 && dst->size == src->size) ? dst->size : needed;
+    const uint64_t copy_length = (dst->size != 0 && dst->size == src->size) ? dst->size : needed;
 
     dst->width = src->width;
     dst->height = src->height;
 
     if (src->format == dst->format) {
-        copy_same_format(*src, *dst, copyLength);
+        copy_same_format(*src, *dst, copy_length);
         return QK_OK;
     }
-    if (srcFamily == Family::kRgb && dstFamily == Family::kRgb) {
+    if (src_family == Family::kRgb && dst_family == Family::kRgb) {
         qk::convert_rgb_to_rgb(*src, *dst);
         return QK_OK;
     }
-    if (srcFamily == Family::kRgb && dstFamily == Family::kYuv) {
+    if (src_family == Family::kRgb && dst_family == Family::kYuv) {
         if (csc_run(src, dst) == QK_OK) {
             QK_LOG(QK_LOG_DEBUG, "[QKImage] Conversion successful with external CSC module");
             return QK_OK;
@@ -97,11 +97,11 @@ int32_t QKImage_convert(const QKImage* src, QKImage* dst) {
         qk::convert_rgb_to_yuv(*src, *dst);
         return QK_OK;
     }
-    if (srcFamily == Family::kYuv && dstFamily == Family::kRgb) {
+    if (src_family == Family::kYuv && dst_family == Family::kRgb) {
         qk::convert_yuv_to_rgb(*src, *dst);
         return QK_OK;
     }
-    if (srcFamily == Family::kYuv && dstFamily == Family::kYuv) {
+    if (src_family == Family::kYuv && dst_family == Family::kYuv) {
         qk::convert_yuv_to_yuv(*src, *dst);
         return QK_OK;
     }

@@ -61,23 +61,23 @@ void convert_yuv_to_rgb(const QKImage& src, QKImage& dst) {
     const int d = rgb_format_index(dst.format);
     const RgbLayout& out = kFormats[d].rgb;
     const ptrdiff_t width = src.width;
-    const ptrdiff_t rowBytes = width * out.bytesPerPixel;
+    const ptrdiff_t row_bytes = width * out.bytesPerPixel;
     if (in.chromaStep == 0) {
         const GreyToRgbRow row = select_grey_to_rgb_row(d);
-        for (ptrdiff_t y = 0; y < src.height; ++y) row(src.data + y * width, dst.data + y * rowBytes, src.width, out);
+        for (ptrdiff_t y = 0; y < src.height; ++y) row(src.data + y * width, dst.data + y * row_bytes, src.width, out);
         return;
     }
     // A 4:2:0 source converts two rows per chroma row.
     const int rows = in.subsampledRows ? 2 : 1;
     const YuvToRgbShape shape{in.lumaStep, in.chromaStep, rows, out};
     const YuvToRgbRow row = select_yuv_to_rgb_row(d, in.lumaStep, in.chromaStep, rows);
-    const ptrdiff_t lumaRowBytes = width * in.lumaStep;
+    const ptrdiff_t luma_row_bytes = width * in.lumaStep;
     for (ptrdiff_t y = 0; y < src.height; y += rows) {
         const ptrdiff_t offset = chroma_row_offset(in, y, width);
-        const uint8_t* luma = src.data + y * lumaRowBytes;
-        uint8_t* pixels = dst.data + y * rowBytes;
-        row(luma, rows == 2 ? luma + lumaRowBytes : nullptr, src.data + in_chroma.u + offset,
-            src.data + in_chroma.v + offset, pixels, rows == 2 ? pixels + rowBytes : nullptr, src.width, shape);
+        const uint8_t* luma = src.data + y * luma_row_bytes;
+        uint8_t* pixels = dst.data + y * row_bytes;
+        row(luma, rows == 2 ? luma + luma_row_bytes : nullptr, src.data + in_chroma.u + offset,
+            src.data + in_chroma.v + offset, pixels, rows == 2 ? pixels + row_bytes : nullptr, src.width, shape);
     }
 }
 
@@ -89,12 +89,12 @@ void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
     const ptrdiff_t width = src.width;
     // Planar luma on both sides is one block; otherwise luma moves row by
     // row together with the chroma of the same rows, while they are cached.
-    const bool blockLuma = in.lumaStep == 1 && out.lumaStep == 1;
-    if (blockLuma) memcpy(dst.data, src.data, static_cast<size_t>(width) * static_cast<size_t>(src.height));
+    const bool block_luma = in.lumaStep == 1 && out.lumaStep == 1;
+    if (block_luma) memcpy(dst.data, src.data, static_cast<size_t>(width) * static_cast<size_t>(src.height));
     const SampleRow luma = select_sample_row(in.lumaStep, out.lumaStep);
     const ChromaRow chroma = select_chroma_row(in.chromaStep, out.chromaStep);
     for (ptrdiff_t y = 0; y < src.height; ++y) {
-        if (!blockLuma) {
+        if (!block_luma) {
             luma(src.data + y * width * in.lumaStep, in.lumaStep, dst.data + y * width * out.lumaStep, out.lumaStep,
                  src.width);
         }

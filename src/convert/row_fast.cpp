@@ -254,8 +254,8 @@ void sample_row(const uint8_t* src, int, uint8_t* dst, int, int count) {
 }
 
 template <int SrcStep, int DstStep>
-void chroma_row(const uint8_t* srcU, const uint8_t* srcV, int, uint8_t* dstU, uint8_t* dstV, int, int count) {
-    chroma_loop(srcU, srcV, SrcStep, dstU, dstV, DstStep, count);
+void chroma_row(const uint8_t* src_u, const uint8_t* src_v, int, uint8_t* dst_u, uint8_t* dst_v, int, int count) {
+    chroma_loop(src_u, src_v, SrcStep, dst_u, dst_v, DstStep, count);
 }
 
 template <size_t... I>
@@ -275,45 +275,45 @@ bool valid_luma_step(int step) { return step == 1 || step == 2; }
 
 }  // namespace
 
-RgbToRgbRow select_rgb_to_rgb_row(int srcIndex, int dstIndex) {
-    if (!valid_rgb_index(srcIndex) || !valid_rgb_index(dstIndex)) return rgb_to_rgb_row_reference;
-    return kRgbToRgbRows[srcIndex * kRgbFormatCount + dstIndex];
+RgbToRgbRow select_rgb_to_rgb_row(int src_index, int dst_index) {
+    if (!valid_rgb_index(src_index) || !valid_rgb_index(dst_index)) return rgb_to_rgb_row_reference;
+    return kRgbToRgbRows[src_index * kRgbFormatCount + dst_index];
 }
 
-RgbToLumaRow select_rgb_to_luma_row(int srcIndex, int lumaStep) {
-    if (!valid_rgb_index(srcIndex) || !valid_luma_step(lumaStep)) return rgb_to_luma_row_reference;
-    return kRgbToLumaRows[srcIndex * 2 + lumaStep - 1];
+RgbToLumaRow select_rgb_to_luma_row(int src_index, int luma_step) {
+    if (!valid_rgb_index(src_index) || !valid_luma_step(luma_step)) return rgb_to_luma_row_reference;
+    return kRgbToLumaRows[src_index * 2 + luma_step - 1];
 }
 
-RgbToChromaRow select_rgb_to_chroma_row(int srcIndex, int chromaStep) {
-    const int step = chroma_step_index(chromaStep);
-    if (!valid_rgb_index(srcIndex) || step < 0) return rgb_to_chroma_row_reference;
-    return kRgbToChromaRows[srcIndex * 3 + step];
+RgbToChromaRow select_rgb_to_chroma_row(int src_index, int chroma_step) {
+    const int step = chroma_step_index(chroma_step);
+    if (!valid_rgb_index(src_index) || step < 0) return rgb_to_chroma_row_reference;
+    return kRgbToChromaRows[src_index * 3 + step];
 }
 
-YuvToRgbRow select_yuv_to_rgb_row(int dstIndex, int lumaStep, int chromaStep, int rows) {
-    if (!valid_rgb_index(dstIndex)) return yuv_to_rgb_row_reference;
+YuvToRgbRow select_yuv_to_rgb_row(int dst_index, int luma_step, int chroma_step, int rows) {
+    if (!valid_rgb_index(dst_index)) return yuv_to_rgb_row_reference;
     for (int i = 0; i < kYuvSourceShapeCount; ++i) {
         const YuvSourceShape& shape = kYuvSourceShapes[i];
-        if (shape.lumaStep == lumaStep && shape.chromaStep == chromaStep && shape.rows == rows) {
-            return kYuvToRgbRows[dstIndex * kYuvSourceShapeCount + i];
+        if (shape.lumaStep == luma_step && shape.chromaStep == chroma_step && shape.rows == rows) {
+            return kYuvToRgbRows[dst_index * kYuvSourceShapeCount + i];
         }
     }
     return yuv_to_rgb_row_reference;
 }
 
-GreyToRgbRow select_grey_to_rgb_row(int dstIndex) {
-    return valid_rgb_index(dstIndex) ? kGreyToRgbRows[dstIndex] : grey_to_rgb_row_reference;
+GreyToRgbRow select_grey_to_rgb_row(int dst_index) {
+    return valid_rgb_index(dst_index) ? kGreyToRgbRows[dst_index] : grey_to_rgb_row_reference;
 }
 
-SampleRow select_sample_row(int srcStep, int dstStep) {
-    if (!valid_luma_step(srcStep) || !valid_luma_step(dstStep)) return sample_row_reference;
-    return kSampleRows[(srcStep - 1) * 2 + dstStep - 1];
+SampleRow select_sample_row(int src_step, int dst_step) {
+    if (!valid_luma_step(src_step) || !valid_luma_step(dst_step)) return sample_row_reference;
+    return kSampleRows[(src_step - 1) * 2 + dst_step - 1];
 }
 
-ChromaRow select_chroma_row(int srcStep, int dstStep) {
-    const int src = chroma_step_index(srcStep);
-    const int dst = chroma_step_index(dstStep);
+ChromaRow select_chroma_row(int src_step, int dst_step) {
+    const int src = chroma_step_index(src_step);
+    const int dst = chroma_step_index(dst_step);
     if (src < 0 || dst < 0) return chroma_row_reference;
     return kChromaRows[src * 3 + dst];
 }

@@ -26,23 +26,23 @@ QK_ROW_LOOP void rgb_to_rgb_loop(const uint8_t* src, uint8_t* dst, ptrdiff_t wid
     }
 }
 
-QK_ROW_LOOP void rgb_to_luma_loop(const uint8_t* rgb, uint8_t* luma, ptrdiff_t width, RgbLayout s, int lumaStep) {
+QK_ROW_LOOP void rgb_to_luma_loop(const uint8_t* rgb, uint8_t* luma, ptrdiff_t width, RgbLayout s, int luma_step) {
     for (ptrdiff_t i = 0; i < width; ++i) {
         const uint8_t* in = rgb + i * s.bytesPerPixel;
-        luma[i * lumaStep] = static_cast<uint8_t>(rgb_luma(in[s.rOffset], in[s.gOffset], in[s.bOffset]));
+        luma[i * luma_step] = static_cast<uint8_t>(rgb_luma(in[s.rOffset], in[s.gOffset], in[s.bOffset]));
     }
 }
 
 // U and V from the left pixel of each pair.
 QK_ROW_LOOP void rgb_to_chroma_loop(const uint8_t* rgb, uint8_t* u, uint8_t* v, ptrdiff_t pairs, RgbLayout s,
-                                    int chromaStep) {
+                                    int chroma_step) {
     for (ptrdiff_t j = 0; j < pairs; ++j) {
         const uint8_t* in = rgb + 2 * j * s.bytesPerPixel;
         const int r = in[s.rOffset];
         const int b = in[s.bOffset];
         const int y = rgb_luma(r, in[s.gOffset], b);
-        u[j * chromaStep] = rgb_chroma_u(b, y);
-        v[j * chromaStep] = rgb_chroma_v(r, y);
+        u[j * chroma_step] = rgb_chroma_u(b, y);
+        v[j * chroma_step] = rgb_chroma_v(r, y);
     }
 }
 
@@ -54,15 +54,15 @@ QK_ROW_LOOP void grey_to_rgb_loop(const uint8_t* luma, uint8_t* dst, ptrdiff_t w
     }
 }
 
-QK_ROW_LOOP void sample_loop(const uint8_t* src, int srcStep, uint8_t* dst, int dstStep, ptrdiff_t count) {
-    for (ptrdiff_t i = 0; i < count; ++i) dst[i * dstStep] = src[i * srcStep];
+QK_ROW_LOOP void sample_loop(const uint8_t* src, int src_step, uint8_t* dst, int dst_step, ptrdiff_t count) {
+    for (ptrdiff_t i = 0; i < count; ++i) dst[i * dst_step] = src[i * src_step];
 }
 
-QK_ROW_LOOP void chroma_loop(const uint8_t* srcU, const uint8_t* srcV, int srcStep, uint8_t* dstU, uint8_t* dstV,
-                             int dstStep, ptrdiff_t count) {
+QK_ROW_LOOP void chroma_loop(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_t* dst_u, uint8_t* dst_v,
+                             int dst_step, ptrdiff_t count) {
     for (ptrdiff_t i = 0; i < count; ++i) {
-        dstU[i * dstStep] = srcU[i * srcStep];
-        dstV[i * dstStep] = srcV[i * srcStep];
+        dst_u[i * dst_step] = src_u[i * src_step];
+        dst_v[i * dst_step] = src_v[i * src_step];
     }
 }
 

@@ -44,13 +44,13 @@ void grey_to_rgb_row_reference(const uint8_t* luma, uint8_t* dst, int width, con
     grey_to_rgb_loop(luma, dst, width, layout);
 }
 
-void sample_row_reference(const uint8_t* src, int srcStep, uint8_t* dst, int dstStep, int count) {
-    sample_loop(src, srcStep, dst, dstStep, count);
+void sample_row_reference(const uint8_t* src, int src_step, uint8_t* dst, int dst_step, int count) {
+    sample_loop(src, src_step, dst, dst_step, count);
 }
 
-void chroma_row_reference(const uint8_t* srcU, const uint8_t* srcV, int srcStep, uint8_t* dstU, uint8_t* dstV,
-                          int dstStep, int count) {
-    chroma_loop(srcU, srcV, srcStep, dstU, dstV, dstStep, count);
+void chroma_row_reference(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_t* dst_u, uint8_t* dst_v,
+                          int dst_step, int count) {
+    chroma_loop(src_u, src_v, src_step, dst_u, dst_v, dst_step, count);
 }
 
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value) {

@@ -26,9 +26,9 @@ std::atomic<bool> module_unavailable{false};
 
 }  // namespace
 
-QKConverter* QKConverter_create(int32_t width, int32_t height, uint32_t srcFormat, uint32_t dstFormat) {
+QKConverter* QKConverter_create(int32_t width, int32_t height, uint32_t src_format, uint32_t dst_format) {
     QK_LOG(QK_LOG_DEBUG, "%s: %dx%d %4.4s --> %4.4s", "QKConverter_create", width, height,
-           QK_FOURCC_STR(srcFormat), QK_FOURCC_STR(dstFormat));
+           QK_FOURCC_STR(src_format), QK_FOURCC_STR(dst_format));
     if (module_unavailable.load(std::memory_order_relaxed)) return nullptr;
 
     QKConverter* converter = new (std::nothrow) QKConverter;
@@ -53,8 +53,8 @@ QKConverter* QKConverter_create(int32_t width, int32_t height, uint32_t srcForma
     }
 
     QK_LOG(QK_LOG_DEBUG, "QKConverter: Calling qk_csc_init: %dx%d %4.4s --> %4.4s", width, height,
-           QK_FOURCC_STR(srcFormat), QK_FOURCC_STR(dstFormat));
-    converter->context = converter->init(width, height, srcFormat, dstFormat);
+           QK_FOURCC_STR(src_format), QK_FOURCC_STR(dst_format));
+    converter->context = converter->init(width, height, src_format, dst_format);
     if (converter->context == nullptr) {
         // Only this conversion is refused: a later call tries the module again.
         QK_LOG(QK_LOG_ERROR, "QKConverter: Could not create this converter.");

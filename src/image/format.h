@@ -155,8 +155,8 @@ inline int rgb_bytes_per_pixel(uint32_t f) {
 // nonzero, else right after the width x height luma plane. 64-bit so that
 // callers can compare it with a buffer size without wrapping. The first form
 // serves images about to take other dimensions.
-inline uint64_t chroma_base(uint32_t chromaOffset, int32_t width, int32_t height) {
-    if (chromaOffset != 0) return chromaOffset;
+inline uint64_t chroma_base(uint32_t chroma_offset, int32_t width, int32_t height) {
+    if (chroma_offset != 0) return chroma_offset;
     return static_cast<uint64_t>(static_cast<int64_t>(width) * height);
 }
 inline uint64_t chroma_base(const QKImage& image) {

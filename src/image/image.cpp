@@ -55,13 +55,13 @@ QKImage* QKImage_createNew(int32_t width, int32_t height, uint32_t format) {
 }
 
 QKImage* QKImage_createWrap(void* data, int32_t width, int32_t height, uint32_t format, int32_t size,
-                            uint32_t chromaOffset) {
+                            uint32_t chroma_offset) {
     QKImage* image = QKImage_createEmpty(width, height, format);
     if (image == nullptr || data == nullptr) return image;
     image->data = static_cast<uint8_t*>(data);
     image->isWrapped = 1;
     image->size = size > 0 ? static_cast<uint64_t>(size) : 0;
-    image->chromaOffset = chromaOffset;
+    image->chromaOffset = chroma_offset;
     return image;
 }
 
@@ -129,7 +129,7 @@ QKImage* QKImage_cloneHeader(const QKImage* source) {
     return QKImage_createEmpty(source->width, source->height, source->format);
 }
 
-int32_t QKImage_wrap(QKImage* image, void* data, int32_t size, uint32_t chromaOffset) {
+int32_t QKImage_wrap(QKImage* image, void* data, int32_t size, uint32_t chroma_offset) {
     if (image == nullptr) return QK_FAIL(QK_ERROR_NULL_PARAM);
     if (data == nullptr) return QK_FAIL(QK_ERROR_NULL_PARAM);
     // Wrapping the image's own buffer would free it and then point at freed memory.
@@ -138,7 +138,7 @@ int32_t QKImage_wrap(QKImage* image, void* data, int32_t size, uint32_t chromaOf
     image->data = static_cast<uint8_t*>(data);
     image->isWrapped = 1;
     image->size = size > 0 ? static_cast<uint64_t>(size) : 0;
-    image->chromaOffset = chromaOffset;
+    image->chromaOffset = chroma_offset;
     if (image->size != 0) return size;
     return static_cast<int32_t>(QKImage_requiredSize(image->width, image->height, image->format));
 }

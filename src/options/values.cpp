@@ -69,14 +69,14 @@ int32_t QKOption_CheckValueS(const QKOption_t* option, const char* value) {
     return 0;
 }
 
-int32_t QKOption_ParseStringI(const char* options, const char* name, int32_t defaultValue) {
+int32_t QKOption_ParseStringI(const char* options, const char* name, int32_t default_value) {
     const char* text = find_item_value(options, name);
-    int32_t value = defaultValue;
-    return text != nullptr && read_int(text, &value) ? value : defaultValue;
+    int32_t value = default_value;
+    return text != nullptr && read_int(text, &value) ? value : default_value;
 }
 
-float QKOption_ParseStringF(const char* options, const char* name, float defaultValue) {
+float QKOption_ParseStringF(const char* options, const char* name, float default_value) {
     const char* text = find_item_value(options, name);
-    float value = defaultValue;
-    return text != nullptr && read_float(text, &value) ? value : defaultValue;
+    float value = default_value;
+    return text != nullptr && read_float(text, &value) ? value : default_value;
 }

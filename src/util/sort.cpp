@@ -17,16 +17,16 @@ void copy_name(char* to, const char* from) {
 
 }  // namespace
 
-void swap(int32_t* keyA, int32_t* keyB, char* nameA, char* nameB) {
-    int32_t key = *keyA;
-    *keyA = *keyB;
-    *keyB = key;
-    if (nameA == nameB) return;  // one buffer: its content is already in place
+void swap(int32_t* key_a, int32_t* key_b, char* name_a, char* name_b) {
+    int32_t key = *key_a;
+    *key_a = *key_b;
+    *key_b = key;
+    if (name_a == name_b) return;  // one buffer: its content is already in place
     char held[kNameBytes];
-    copy_name(held, nameA);
+    copy_name(held, name_a);
     held[kNameBytes - 1] = '\0';
-    copy_name(nameA, nameB);
-    copy_name(nameB, held);
+    copy_name(name_a, name_b);
+    copy_name(name_b, held);
 }
 
 // Quicksort with Hoare partitioning, largest key first. The two parts of a

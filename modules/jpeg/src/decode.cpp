@@ -25,7 +25,7 @@ constexpr int kDecodeFlags = TJFLAG_STOPONWARNING | TJFLAG_LIMITSCANS;
 // NV12/NV21 chroma is interleaved from two small planes. Odd sizes decode
 // into padded planes first, TurboJPEG's reaching past the picture.
 bool decode_420(tjhandle handle, const unsigned char* stream, unsigned long size, int width, int height,
-                uint32_t format, uint8_t* out, uint64_t outBytes) {
+                uint32_t format, uint8_t* out, uint64_t out_bytes) {
     const qk::jpeg::Chroma420 chroma = qk::jpeg::chroma420(width, height, format);
     const qk::jpeg::TurboPlanes turbo = qk::jpeg::turbo_planes(width, height, true);
     const bool even = width % 2 == 0 && height % 2 == 0;
@@ -34,16 +34,16 @@ bool decode_420(tjhandle handle, const unsigned char* stream, unsigned long size
     if (even && chroma.step == 1) {
         return tjDecompressToYUVPlanes(handle, stream, size, planes, width, strides, height, kDecodeFlags) == 0;
     }
-    const size_t lumaBytes = even ? 0 : turbo.lumaWidth * turbo.lumaHeight;
-    const size_t chromaBytes = turbo.chromaWidth * turbo.chromaHeight;
-    Block scratch = qk::jpeg::allocate(lumaBytes + 2 * chromaBytes);
+    const size_t luma_bytes = even ? 0 : turbo.lumaWidth * turbo.lumaHeight;
+    const size_t chroma_bytes = turbo.chromaWidth * turbo.chromaHeight;
+    Block scratch = qk::jpeg::allocate(luma_bytes + 2 * chroma_bytes);
     if (!scratch) return false;
     if (!even) {
         planes[0] = scratch.get();
         strides[0] = static_cast<int>(turbo.lumaWidth);
     }
-    planes[1] = scratch.get() + lumaBytes;
-    planes[2] = planes[1] + chromaBytes;
+    planes[1] = scratch.get() + luma_bytes;
+    planes[2] = planes[1] + chroma_bytes;
     if (tjDecompressToYUVPlanes(handle, stream, size, planes, width, strides, height, kDecodeFlags) != 0) {
         return false;
     }
@@ -52,7 +52,7 @@ bool decode_420(tjhandle handle, const unsigned char* stream, unsigned long size
         qk::jpeg::copy_plane(planes[0], turbo.lumaWidth, out, w, w, h);
         // Some bytes of an odd-sized buffer belong to no sample: neutral
         // chroma rather than whatever malloc left there.
-        memset(out + w * h, qk::jpeg::kNeutralChroma, outBytes - w * h);
+        memset(out + w * h, qk::jpeg::kNeutralChroma, out_bytes - w * h);
     }
     qk::jpeg::scatter420(planes[1], planes[2], turbo.chromaWidth, chroma, out);
     return true;
@@ -64,9 +64,9 @@ extern "C" __attribute__((visibility("default"))) void* fastJpegDecode(const voi
                                                                        int32_t* width, int32_t* height,
                                                                        uint32_t format) {
     if (data == nullptr || size == 0 || width == nullptr || height == nullptr) return nullptr;
-    const int pixelFormat = qk::jpeg::tj_pixel_format(format);
+    const int pixel_format = qk::jpeg::tj_pixel_format(format);
     const bool yuv420 = qk::is_yuv420_format(format);
-    if (pixelFormat < 0 && !yuv420) return nullptr;
+    if (pixel_format < 0 && !yuv420) return nullptr;
 
     Handle handle(tjInitDecompress());
     if (!handle) return nullptr;
@@ -83,7 +83,7 @@ extern "C" __attribute__((visibility("default"))) void* fastJpegDecode(const voi
     if (!out) return nullptr;
 
     const bool decoded = yuv420 ? decode_420(handle.get(), stream, size, w, h, format, out.get(), bytes)
-                                : tjDecompress2(handle.get(), stream, size, out.get(), w, 0, h, pixelFormat,
+                                : tjDecompress2(handle.get(), stream, size, out.get(), w, 0, h, pixel_format,
                                                 kDecodeFlags) == 0;
     if (!decoded) return nullptr;
     *width = w;

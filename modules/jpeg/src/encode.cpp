@@ -41,14 +41,14 @@ void* compress_into_block(int32_t width, int32_t height, int subsamp, uint32_t* 
     return trimmed != nullptr ? trimmed : whole;
 }
 
-void* encode_packed(const uint8_t* pixels, int32_t width, int32_t height, int pixelFormat, int quality,
+void* encode_packed(const uint8_t* pixels, int32_t width, int32_t height, int pixel_format, int quality,
                     uint32_t* length) {
     // Colour pictures are coded 4:2:0, the camera's own sampling, so that
     // they also decode straight into the 4:2:0 formats.
-    const int subsamp = pixelFormat == TJPF_GRAY ? TJSAMP_GRAY : TJSAMP_420;
+    const int subsamp = pixel_format == TJPF_GRAY ? TJSAMP_GRAY : TJSAMP_420;
     return compress_into_block(width, height, subsamp, length,
                                [&](tjhandle handle, unsigned char** stream, unsigned long* written) {
-                                   return tjCompress2(handle, pixels, width, 0, height, pixelFormat, stream,
+                                   return tjCompress2(handle, pixels, width, 0, height, pixel_format, stream,
                                                       written, subsamp, quality, TJFLAG_NOREALLOC);
                                });
 }
@@ -75,9 +75,9 @@ void* encode_420(const uint8_t* pixels, int32_t width, int32_t height, uint32_t 
     // lie: NV12/NV21 chroma costs one de-interleaving pass. Odd sizes take
     // copies padded to TurboJPEG's planes, which reach past the picture.
     if (!even || chroma.step != 1) {
-        const size_t lumaBytes = even ? 0 : turbo.lumaWidth * turbo.lumaHeight;
-        const size_t chromaBytes = turbo.chromaWidth * turbo.chromaHeight;
-        scratch = qk::jpeg::allocate(lumaBytes + 2 * chromaBytes);
+        const size_t luma_bytes = even ? 0 : turbo.lumaWidth * turbo.lumaHeight;
+        const size_t chroma_bytes = turbo.chromaWidth * turbo.chromaHeight;
+        scratch = qk::jpeg::allocate(luma_bytes + 2 * chroma_bytes);
         if (!scratch) return nullptr;
         uint8_t* luma = scratch.get();
         if (!even) {
@@ -87,10 +87,10 @@ void* encode_420(const uint8_t* pixels, int32_t width, int32_t height, uint32_t 
             planes[0] = luma;
             strides[0] = static_cast<int>(turbo.lumaWidth);
         }
-        uint8_t* u = luma + lumaBytes;
-        qk::jpeg::gather420(pixels, chroma, u, u + chromaBytes, turbo.chromaWidth, turbo.chromaHeight);
+        uint8_t* u = luma + luma_bytes;
+        qk::jpeg::gather420(pixels, chroma, u, u + chroma_bytes, turbo.chromaWidth, turbo.chromaHeight);
         planes[1] = u;
-        planes[2] = u + chromaBytes;
+        planes[2] = u + chroma_bytes;
     }
     return encode_planes(planes, strides, width, height, TJSAMP_420, quality, length);
 }
@@ -100,15 +100,15 @@ void* encode_420(const uint8_t* pixels, int32_t width, int32_t height, uint32_t 
 void* encode_422(const uint8_t* pixels, int32_t width, int32_t height, uint32_t format, int quality,
                  uint32_t* length) {
     const qk::jpeg::TurboPlanes turbo = qk::jpeg::turbo_planes(width, height, false);
-    const size_t lumaBytes = turbo.lumaWidth * turbo.lumaHeight;
-    const size_t chromaBytes = turbo.chromaWidth * turbo.chromaHeight;
-    Block scratch = qk::jpeg::allocate(lumaBytes + 2 * chromaBytes);
+    const size_t luma_bytes = turbo.lumaWidth * turbo.lumaHeight;
+    const size_t chroma_bytes = turbo.chromaWidth * turbo.chromaHeight;
+    Block scratch = qk::jpeg::allocate(luma_bytes + 2 * chroma_bytes);
     if (!scratch) return nullptr;
     uint8_t* y = scratch.get();
     const qk::YuvLayout& layout = qk::yuv_layout(format);
-    qk::jpeg::split422(pixels, width, height, layout.uOffset < layout.vOffset, y, y + lumaBytes,
-                       y + lumaBytes + chromaBytes);
-    const uint8_t* planes[3] = {y, y + lumaBytes, y + lumaBytes + chromaBytes};
+    qk::jpeg::split422(pixels, width, height, layout.uOffset < layout.vOffset, y, y + luma_bytes,
+                       y + luma_bytes + chroma_bytes);
+    const uint8_t* planes[3] = {y, y + luma_bytes, y + luma_bytes + chroma_bytes};
     const int strides[3] = {static_cast<int>(turbo.lumaWidth), static_cast<int>(turbo.chromaWidth),
                             static_cast<int>(turbo.chromaWidth)};
     return encode_planes(planes, strides, width, height, TJSAMP_422, quality, length);
@@ -128,8 +128,8 @@ extern "C" __attribute__((visibility("default"))) void* fastJpegEncode(const voi
     if (width > qk::jpeg::kMaxSide || height > qk::jpeg::kMaxSide) return nullptr;
     const auto* bytes = static_cast<const uint8_t*>(pixels);
     const int q = clamp_quality(quality);
-    const int pixelFormat = qk::jpeg::tj_pixel_format(format);
-    if (pixelFormat >= 0) return encode_packed(bytes, width, height, pixelFormat, q, length);
+    const int pixel_format = qk::jpeg::tj_pixel_format(format);
+    if (pixel_format >= 0) return encode_packed(bytes, width, height, pixel_format, q, length);
     if (qk::is_yuv420_format(format)) return encode_420(bytes, width, height, format, q, length);
     if (qk::is_packed422_format(format)) return encode_422(bytes, width, height, format, q, length);
     return nullptr;
