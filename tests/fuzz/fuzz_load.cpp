@@ -1,0 +1,60 @@
+// Fuzz target: loading a file into an image of any format, size and buffer
+// (none, the library's own, or the caller's of exactly its recorded size):
+// a picture, or raw pixels when it is none.
+//
+// Input: the image (Frame::make), then the file's contents: the rest. The
+// file is this process's own under /tmp and is removed after each input.
+#include <dlfcn.h>
+#include <stdint.h>
+#include <stdio.h>
+#include <unistd.h>
+
+#include <string>
+#include <vector>
+
+#include "codec/codec.h"
+#include "fuzz/fuzz_support.h"
+#include "platform/picture.h"
+#include "qkcore/qk_image.h"
+
+namespace {
+
+std::string g_path;
+
+bool setup() {
+    qkfuzz::quiet_log();
+    // Pictures past 16 MB of RGBA are refused from their header: fuzzing
+    // stays small and fast.
+    qk::platform::set_max_picture_bytes(16 << 20);
+    // The library loads the codec module for each call and closes it after.
+    // Held open here, it stays mapped for the whole run: libFuzzer keeps the
+    // addresses of its coverage counters.
+    dlopen(qk::kJpegModule, RTLD_NOW);
+    g_path = "/tmp/qk_fuzz_load." + std::to_string(getpid());
+    QKImage* image = QKImage_createEmpty(2, 2, QK_FORMAT_RGBA);
+    qkfuzz::check(QKImage_loadFromFile(nullptr, "/dev/null") < 0 && QKImage_loadFromFile(image, nullptr) < 0,
+                  "load with a null image or path");
+    QKImage_destroy(image);
+    return true;
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+    static const bool ready = setup();
+    (void)ready;
+    qkfuzz::Input in(data, size);
+    qkfuzz::Frame frame;
+    frame.make(in);
+    const std::vector<uint8_t> contents = in.rest();
+    FILE* file = fopen(g_path.c_str(), "wb");
+    qkfuzz::check(file != nullptr, "cannot create the file to load");
+    const size_t written = contents.empty() ? 0 : fwrite(contents.data(), 1, contents.size(), file);
+    qkfuzz::check(fclose(file) == 0 && written == contents.size(), "cannot write the file to load");
+
+    const qkfuzz::Snapshot before(frame.image, frame.length());
+    const int32_t status = QKImage_loadFromFile(frame.image, g_path.c_str());
+    unlink(g_path.c_str());
+    qkfuzz::check_decoded(frame, before, status);
+    return 0;
+}
