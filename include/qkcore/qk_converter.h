@@ -19,7 +19,7 @@ typedef int32_t (*QKCscConvertFn)(void* context, const QKImage* src, QKImage* ds
 //   "qk_csc_release": ends the context.
 typedef void (*QKCscReleaseFn)(void* context);
 
-extern "C" {
+QK_BEGIN_C_DECLS
 
 // Loads the module and makes a converter, or returns null: when the module
 // cannot be loaded or lacks an entry point (then no later call tries again,
@@ -33,8 +33,9 @@ QK_API int32_t QKConverter_convert(QKConverter* converter, const QKImage* src, Q
 // Ends the module's context and drops the handle; null does nothing.
 QK_API void QKConverter_release(QKConverter* converter);
 
-}  // extern "C"
+QK_END_C_DECLS
 
+#ifdef __cplusplus
 // The platform's colour-conversion fast path (libcsc.so, loaded for each call
 // when present). Takes only BGRA to NV12, with the destination already of the
 // source's dimensions and large enough; declines every other pair at once
@@ -42,5 +43,6 @@ QK_API void QKConverter_release(QKConverter* converter);
 // routine filled the destination, else a negative status with the
 // destination untouched. Exported under its C++ (type-mangled) name.
 QK_API int32_t csc_run(const QKImage* src, QKImage* dst);
+#endif
 
 #endif  // QKCORE_QK_CONVERTER_H

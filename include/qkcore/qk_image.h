@@ -9,35 +9,44 @@
 
 #include "qk_common.h"
 
-// A format code is four characters, the first in the lowest byte.
+// A format code is four characters, the first in the lowest byte. The codes
+// are constant expressions of type uint32_t in both languages (switch cases
+// included).
+#ifdef __cplusplus
 constexpr uint32_t QK_FOURCC(char a, char b, char c, char d) {
     return uint32_t(uint8_t(a)) | uint32_t(uint8_t(b)) << 8 | uint32_t(uint8_t(c)) << 16 |
            uint32_t(uint8_t(d)) << 24;
 }
+#else
+#define QK_FOURCC(a, b, c, d)                                                        \
+    ((uint32_t)(uint8_t)(a) | (uint32_t)(uint8_t)(b) << 8 | (uint32_t)(uint8_t)(c) << 16 | \
+     (uint32_t)(uint8_t)(d) << 24)
+#endif
 
 // RGB family: bytes in memory in the order of the letters.
-constexpr uint32_t QK_FORMAT_RGBA = QK_FOURCC('R', 'G', 'B', 'A');
-constexpr uint32_t QK_FORMAT_BGRA = QK_FOURCC('B', 'G', 'R', 'A');
-constexpr uint32_t QK_FORMAT_ARGB = QK_FOURCC('A', 'R', 'G', 'B');
-constexpr uint32_t QK_FORMAT_ABGR = QK_FOURCC('A', 'B', 'G', 'R');
-constexpr uint32_t QK_FORMAT_RGB8 = QK_FOURCC('R', 'G', 'B', '8');
-constexpr uint32_t QK_FORMAT_BGR8 = QK_FOURCC('B', 'G', 'R', '8');
+#define QK_FORMAT_RGBA QK_FOURCC('R', 'G', 'B', 'A')
+#define QK_FORMAT_BGRA QK_FOURCC('B', 'G', 'R', 'A')
+#define QK_FORMAT_ARGB QK_FOURCC('A', 'R', 'G', 'B')
+#define QK_FORMAT_ABGR QK_FOURCC('A', 'B', 'G', 'R')
+#define QK_FORMAT_RGB8 QK_FOURCC('R', 'G', 'B', '8')
+#define QK_FORMAT_BGR8 QK_FOURCC('B', 'G', 'R', '8')
 // YUV family.
-constexpr uint32_t QK_FORMAT_GREY = QK_FOURCC('G', 'R', 'E', 'Y');  // luma only
-constexpr uint32_t QK_FORMAT_YUYV = QK_FOURCC('Y', 'U', 'Y', 'V');  // 4:2:2 Y0 U Y1 V
-constexpr uint32_t QK_FORMAT_YVYU = QK_FOURCC('Y', 'V', 'Y', 'U');  // 4:2:2 Y0 V Y1 U
-constexpr uint32_t QK_FORMAT_NV12 = QK_FOURCC('N', 'V', '1', '2');  // 4:2:0 Y, then UV pairs
-constexpr uint32_t QK_FORMAT_NV21 = QK_FOURCC('N', 'V', '2', '1');  // 4:2:0 Y, then VU pairs
-constexpr uint32_t QK_FORMAT_YV12 = QK_FOURCC('Y', 'V', '1', '2');  // 4:2:0 Y, V plane, U plane
-constexpr uint32_t QK_FORMAT_YUVP = QK_FOURCC('Y', 'U', 'V', 'P');  // 4:2:0 Y, U plane, V plane
+#define QK_FORMAT_GREY QK_FOURCC('G', 'R', 'E', 'Y')  // luma only
+#define QK_FORMAT_YUYV QK_FOURCC('Y', 'U', 'Y', 'V')  // 4:2:2 Y0 U Y1 V
+#define QK_FORMAT_YVYU QK_FOURCC('Y', 'V', 'Y', 'U')  // 4:2:2 Y0 V Y1 U
+#define QK_FORMAT_NV12 QK_FOURCC('N', 'V', '1', '2')  // 4:2:0 Y, then UV pairs
+#define QK_FORMAT_NV21 QK_FOURCC('N', 'V', '2', '1')  // 4:2:0 Y, then VU pairs
+#define QK_FORMAT_YV12 QK_FOURCC('Y', 'V', '1', '2')  // 4:2:0 Y, V plane, U plane
+#define QK_FORMAT_YUVP QK_FOURCC('Y', 'U', 'V', 'P')  // 4:2:0 Y, U plane, V plane
 // Copy-only formats.
-constexpr uint32_t QK_FORMAT_D16 = QK_FOURCC('D', '1', '6', '\0');  // 16-bit depth samples
-constexpr uint32_t QK_FORMAT_PCL = QK_FOURCC('P', 'C', 'L', '\0');  // 36-byte header + 16 bytes a point
+#define QK_FORMAT_D16 QK_FOURCC('D', '1', '6', '\0')  // 16-bit depth samples
+#define QK_FORMAT_PCL QK_FOURCC('P', 'C', 'L', '\0')  // 36-byte header + 16 bytes a point
 // An encoded stream whose length is the image's recorded size.
-constexpr uint32_t QK_FORMAT_JPEG = QK_FOURCC('J', 'P', 'E', 'G');
+#define QK_FORMAT_JPEG QK_FOURCC('J', 'P', 'E', 'G')
 
 // The image object. The field order and widths are a binary contract with
 // modules outside the library: do not reorder or resize them.
+#ifdef __cplusplus
 class QKImage {
 public:
     // Frees the buffer unless it is the caller's, and forgets it.
@@ -57,8 +66,23 @@ public:
     uint64_t size = 0;          // buffer bytes; 0 means "not recorded: use the size rule"
     uint32_t chromaOffset = 0;  // 4:2:0 chroma start; 0 means right after the luma plane
 };
+#else
+// C sees the same object: the C++ class's table pointer comes first. Only the
+// library makes and destroys images (QKImage_create*, QKImage_clone*,
+// QKImage_destroy); C code reads and sets the fields, never vtable_.
+typedef struct QKImage {
+    const void* const* vtable_;
+    uint8_t* data;
+    int32_t width;
+    int32_t height;
+    uint32_t format;
+    uint32_t isWrapped;
+    uint64_t size;
+    uint32_t chromaOffset;
+} QKImage;
+#endif
 
-extern "C" {
+QK_BEGIN_C_DECLS
 
 // Bytes a buffer of these dimensions and format occupies, or 0 when none can
 // be given (a dimension below 1, an encoded or unknown format, or a size that
@@ -150,8 +174,9 @@ QK_API int32_t QKImage_saveToFile(const QKImage* image, const char* path, int32_
 // height and format the image already has.
 QK_API int32_t QKImage_loadFromFile(QKImage* image, const char* path);
 
-}  // extern "C"
+QK_END_C_DECLS
 
+#ifdef __cplusplus
 // Writes `size` bytes to `path` (created, or cut to the new length), in as
 // many writes as the system needs; the outcome is only logged. Exported
 // under its C++ (type-mangled) name.
@@ -159,5 +184,6 @@ QK_API void save_to_file(const char* path, unsigned char* data, unsigned int siz
 // The length of the open stream in bytes, or -1; the stream's position is
 // left where it was. Exported under its C++ (type-mangled) name.
 QK_API int64_t fsize(FILE* stream);
+#endif
 
 #endif  // QKCORE_QK_IMAGE_H

@@ -9,7 +9,7 @@
 
 // Log levels. Each prints a tag in front of the message on standard output:
 // "[V]", "[D]", "[I]", "[W]", "[E]"; any other value prints "[V]".
-enum QKLogLevel : int {
+QK_TYPED_ENUM(QKLogLevel, int) {
     QK_LOG_VERBOSE = 0,
     QK_LOG_DEBUG = 1,    // progress and parameters
     QK_LOG_INFO = 2,
@@ -24,8 +24,11 @@ typedef int (*QKLogFn)(int level, ...);
 // The hook every message of the library goes through. It is read at each
 // message, so assigning another function takes effect at the next one. It
 // must always hold a valid function; its initial value is AndroidLogMsg.
-extern "C" QK_API QKLogFn HX_LogMsg;
+QK_BEGIN_C_DECLS
+extern QK_API QKLogFn HX_LogMsg;
+QK_END_C_DECLS
 
+#ifdef __cplusplus
 // Writes "<tag> <message>\n" to standard output and the message to the
 // system log (Android's log on Android, syslog elsewhere) under "velcamera".
 QK_API int AndroidLogMsg(int level, ...);
@@ -56,5 +59,6 @@ public:
     const char* tag;   // null for probes made with the two-argument constructor
     int32_t line;      // -1 for probes made with the two-argument constructor
 };
+#endif  // __cplusplus
 
 #endif  // QKCORE_QK_LOG_H

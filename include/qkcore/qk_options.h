@@ -8,7 +8,7 @@
 #include "qk_common.h"
 
 // The type of an option (QKOption_t::type). Any other value is invalid.
-enum QKOptionType : uint32_t {
+QK_TYPED_ENUM(QKOptionType, uint32_t) {
     QK_OPTION_INTEGER = 0,
     QK_OPTION_FLOAT = 1,
     QK_OPTION_STRING = 2,
@@ -16,7 +16,11 @@ enum QKOptionType : uint32_t {
 };
 
 // The value of the entry that ends an enumeration list.
+#ifdef __cplusplus
 constexpr int32_t QK_OPTION_ENUM_END = -1;
+#else
+#define QK_OPTION_ENUM_END ((int32_t)-1)
+#endif
 
 // One entry of an enumeration. A list ends with an entry whose value is
 // QK_OPTION_ENUM_END; that entry's name is not read.
@@ -25,13 +29,16 @@ typedef struct QKOptionEnum_t {
     const char* name;
 } QKOptionEnum_t;
 
-// One 32-bit bound: `i` for INTEGER options, `f` for FLOAT options. The
-// constructors let records be written as aggregates: {0, "ev", QK_OPTION_FLOAT,
-// -2.0f, 2.0f, nullptr} or {0, "iso", QK_OPTION_INTEGER, 100, 3200, nullptr}.
+// One 32-bit bound: `i` for INTEGER options, `f` for FLOAT options. In C++
+// the constructors let records be written as aggregates: {0, "ev",
+// QK_OPTION_FLOAT, -2.0f, 2.0f, nullptr} or {0, "iso", QK_OPTION_INTEGER,
+// 100, 3200, nullptr}; C names the member of a float bound: {.f = -2.0f}.
 typedef union QKOptionBound_t {
+#ifdef __cplusplus
     constexpr QKOptionBound_t() : i(0) {}
     constexpr QKOptionBound_t(int32_t value) : i(value) {}
     constexpr QKOptionBound_t(float value) : f(value) {}
+#endif
 
     int32_t i;
     float f;
@@ -50,7 +57,7 @@ typedef struct QKOption_t {
     const QKOptionEnum_t* enumValues;  // ENUM: the values, ended by QK_OPTION_ENUM_END
 } QKOption_t;
 
-extern "C" {
+QK_BEGIN_C_DECLS
 
 // Registers the record and returns 1, or returns 0 when it is refused (null
 // record or name, or a key already in the register). A record without a key
@@ -84,6 +91,6 @@ QK_API int32_t QKOption_CheckValueS(const QKOption_t* option, const char* value)
 QK_API int32_t QKOption_ParseStringI(const char* options, const char* name, int32_t defaultValue);
 QK_API float QKOption_ParseStringF(const char* options, const char* name, float defaultValue);
 
-}  // extern "C"
+QK_END_C_DECLS
 
 #endif  // QKCORE_QK_OPTIONS_H
