@@ -5,6 +5,6 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 scripts/install-deps.sh
 
-cmake -S . -B build/release -G Ninja -DCMAKE_BUILD_TYPE=Release
+cmake -S . -B build/release -G Ninja -DCMAKE_BUILD_TYPE=Release -DQKCORE_WERROR=ON
 cmake --build build/release -j "$(nproc)" --target qkimage
 build/release/tools/qkimage/qkimage demo --out build/release/qkimage-demo

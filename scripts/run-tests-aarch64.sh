@@ -14,6 +14,6 @@ build=${QK_BUILD_DIR:-build/aarch64}
 
 echo "== AArch64 build, tests under qemu-aarch64"
 cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=Release \
-  -DCMAKE_TOOLCHAIN_FILE="$PWD/cmake/aarch64-linux-gnu.cmake" -DQK_BUILD_BENCH=OFF
+  -DCMAKE_TOOLCHAIN_FILE="$PWD/cmake/aarch64-linux-gnu.cmake" -DQK_BUILD_BENCH=OFF -DQKCORE_WERROR=ON
 cmake --build "$build" -j "$jobs"
 (cd "$build" && ctest -j "$jobs" --timeout 600 --output-on-failure)

@@ -7,7 +7,7 @@ scripts/install-deps.sh
 jobs=$(nproc)
 
 echo "== optimised build"
-cmake -S . -B build/release -G Ninja -DCMAKE_BUILD_TYPE=Release
+cmake -S . -B build/release -G Ninja -DCMAKE_BUILD_TYPE=Release -DQKCORE_WERROR=ON
 cmake --build build/release -j "$jobs"
 (cd build/release && ctest -j "$jobs" --timeout 600 --output-on-failure)
 
@@ -15,7 +15,7 @@ cmake --build build/release -j "$jobs"
 # leaves its object, which GCC's does not.
 echo "== AddressSanitizer + UndefinedBehaviorSanitizer build (clang)"
 CC=clang CXX=clang++ cmake -S . -B build/asan -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo -DQK_SANITIZE=ON \
-  -DQK_BUILD_BENCH=OFF
+  -DQK_BUILD_BENCH=OFF -DQKCORE_WERROR=ON
 cmake --build build/asan -j "$jobs"
 (cd build/asan &&
   ASAN_OPTIONS=detect_leaks=1:abort_on_error=1:strict_string_checks=1 \
