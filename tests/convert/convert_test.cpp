@@ -1,5 +1,5 @@
-// QKImage_convert and QKImage_copyAndConvert: validation, copies, routing,
-// and every format pair against the plain reference.
+// QKImage_convert and QKImage_copyAndConvert: refusals, copies, worked
+// examples, and every format pair against the plain reference.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -11,6 +11,7 @@
 
 #include "convert/reference_frame.h"
 #include "qkcore/qk_image.h"
+#include "support/images.h"
 #include "support/log_capture.h"
 
 namespace {
@@ -22,26 +23,9 @@ constexpr uint32_t RGBA = QK_FORMAT_RGBA, BGRA = QK_FORMAT_BGRA, RGB8 = QK_FORMA
                    YUYV = QK_FORMAT_YUYV, NV12 = QK_FORMAT_NV12, NV21 = QK_FORMAT_NV21, YV12 = QK_FORMAT_YV12,
                    D16 = QK_FORMAT_D16, PCL = QK_FORMAT_PCL, JPEG = QK_FORMAT_JPEG;
 
-// A format code as "%4.4s" prints it: up to four characters, right-aligned.
-std::string name_of(uint32_t format) {
-    std::string name(reinterpret_cast<const char*>(&format), 4);
-    name = name.substr(0, name.find('\0'));
-    return std::string(4 - name.size(), ' ') + name;
-}
-
-TEST(Convert, NullImagesAreRefusedBeforeAnythingIsLogged) {
-    TestImage image({RGBA, 2, 2, 16});
-    for (auto [src, dst] : {std::pair<const QKImage*, QKImage*>{nullptr, &image.image}, {&image.image, nullptr}}) {
-        LogCapture log;
-        EXPECT_EQ(QKImage_convert(src, dst), QK_ERROR_NULL_PARAM);
-        EXPECT_EQ(log.lines().size(), 1u);
-        EXPECT_TRUE(HasOneFailureReport(log, QK_ERROR_NULL_PARAM, kEntryFile));
-    }
-}
-
 // Each refusal logs the entry line with the dimensions as passed, and one
 // report; only pairs outside the families get as far as adopting the
-// source's dimensions.
+// source's dimensions. Null images are refused before anything is logged.
 TEST(Convert, RefusalsLeaveTheDestinationsBytesAsTheyWere) {
     constexpr int32_t PARAM = QK_ERROR_INVALID_PARAM, SIZE = QK_ERROR_INVALID_SIZE, NONE = QK_ERROR_UNSUPPORTED;
     const struct {
@@ -64,6 +48,7 @@ TEST(Convert, RefusalsLeaveTheDestinationsBytesAsTheyWere) {
         {"destination chroma past its buffer", {RGBA, 16, 8, 512}, {NV12, 16, 8, 319, 319, 256}, SIZE},
         {"source chroma past its recorded size", {NV21, 16, 8, 319, 319, 256}, {RGBA, 16, 8, 512}, SIZE},
         {"source recording fewer bytes than its picture", {RGBA, 4, 4, 64, 63}, {BGRA, 4, 4, 64}, SIZE},
+        {"source past the byte range", {RGBA, 100000, 100000, 64, 64}, {RGBA, 4, 4, 64}, PARAM},
         {"D16 to GREY", {D16, 4, 2, 256}, {GREY, 2, 2, 256, 256}, NONE},
         {"PCL to RGBA", {PCL, 4, 2, 256}, {RGBA, 2, 2, 256, 256}, NONE},
         {"RGBA to D16", {RGBA, 4, 2, 256}, {D16, 2, 2, 256, 256}, NONE},
@@ -71,22 +56,26 @@ TEST(Convert, RefusalsLeaveTheDestinationsBytesAsTheyWere) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
-        TestImage src(c.src), dst(c.dst);
+        Frame src(c.src), dst(c.dst);
         const std::vector<uint8_t> before = dst.buffer;
         LogCapture log;
         EXPECT_EQ(QKImage_convert(&src.image, &dst.image), c.status);
         EXPECT_TRUE(HasOneFailureReport(log, c.status, kEntryFile));
-        EXPECT_TRUE(log.contains(1, "[QKImage] Converting from " + std::to_string(c.src.width) + "x" +
-                                        std::to_string(c.src.height) + " " + name_of(c.src.format) + " to " +
-                                        std::to_string(c.dst.width) + "x" + std::to_string(c.dst.height) + " " +
-                                        name_of(c.dst.format)));
+        auto shape = [](const ImageSpec& s) { return std::to_string(s.width) + "x" + std::to_string(s.height); };
+        EXPECT_TRUE(log.contains(1, "[QKImage] Converting from " + shape(c.src) + " " + fourcc(c.src.format, true) +
+                                        " to " + shape(c.dst) + " " + fourcc(c.dst.format, true)));
         EXPECT_EQ(dst.buffer, before);
-        const ImageSpec& shape = c.status == NONE ? c.src : c.dst;
-        EXPECT_EQ(std::make_pair(dst.image.width, dst.image.height), std::make_pair(shape.width, shape.height));
-        if (c.status == NONE) {
-            EXPECT_TRUE(log.contains(4, "[QKImage] Can not convert " + name_of(c.src.format) + " into " +
-                                            name_of(c.dst.format)));
-        }
+        const ImageSpec& adopted = c.status == NONE ? c.src : c.dst;
+        EXPECT_EQ(std::make_pair(dst.image.width, dst.image.height), std::make_pair(adopted.width, adopted.height));
+        EXPECT_TRUE(c.status != NONE || log.contains(4, "[QKImage] Can not convert " + fourcc(c.src.format, true) +
+                                                            " into " + fourcc(c.dst.format, true)));
+    }
+    Frame image({RGBA, 2, 2, 16});
+    for (auto [src, dst] : {std::pair<const QKImage*, QKImage*>{nullptr, &image.image}, {&image.image, nullptr}}) {
+        LogCapture log;
+        EXPECT_EQ(QKImage_convert(src, dst), QK_ERROR_NULL_PARAM);
+        EXPECT_EQ(log.lines().size(), 1u);
+        EXPECT_TRUE(HasOneFailureReport(log, QK_ERROR_NULL_PARAM, kEntryFile));
     }
 }
 
@@ -111,8 +100,8 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
     };
     std::mt19937 random(7);
     for (const auto& c : cases) {
-        SCOPED_TRACE(name_of(c.src.format));
-        TestImage src(c.src), dst(c.dst);
+        SCOPED_TRACE(&c - cases);
+        Frame src(c.src), dst(c.dst, 200);
         src.randomize(random);
         std::vector<uint8_t> expected = dst.buffer;
         for (const Block& block : c.blocks) {
@@ -124,15 +113,15 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
         EXPECT_EQ(dst.buffer, expected);
     }
     // An image converted into itself stays as it is.
-    TestImage image({NV21, 16, 8, 192});
+    Frame image({NV21, 16, 8, 192});
     const std::vector<uint8_t> before = image.buffer;
     EXPECT_EQ(QKImage_convert(&image.image, &image.image), QK_OK);
     EXPECT_EQ(image.buffer, before);
 }
 
-// Small hand-checked conversions, as a check on the plain reference as much
-// as on the library: the two formulas with the chroma orders of semi-planar
-// and planar 4:2:0, luma-only sources, and a packed layout.
+// Hand-checked conversions, as a check on the plain reference as much as on
+// the library: both formulas, the chroma orders of semi-planar and planar
+// 4:2:0, luma-only sources, a packed layout; one spare byte stays.
 TEST(Convert, WorkedExamples) {
     const std::vector<uint8_t> rgbSquare = {255, 0, 0, 0, 255, 0, 0, 0, 255, 255, 255, 255};
     const struct {
@@ -151,14 +140,11 @@ TEST(Convert, WorkedExamples) {
         {YUYV, 2, 2, {1, 10, 2, 20, 3, 30, 4, 40}, NV12, {1, 2, 3, 4, 10, 20}},
     };
     for (const auto& e : examples) {
-        SCOPED_TRACE(name_of(e.from) + " to " + name_of(e.to));
-        TestImage src({e.from, e.width, e.height, e.in.size()});
+        SCOPED_TRACE(fourcc(e.from) + " to " + fourcc(e.to));
+        Frame src({e.from, e.width, e.height, e.in.size()}), dst({e.to, e.width, e.height, e.out.size() + 1});
         std::copy(e.in.begin(), e.in.end(), src.buffer.begin());
-        // One spare byte shows that nothing is written past the result.
-        TestImage dst({e.to, e.width, e.height, e.out.size() + 1, e.out.size() + 1});
-        std::fill(dst.buffer.begin(), dst.buffer.end(), 0xEE);
         std::vector<uint8_t> expected = e.out;
-        expected.push_back(0xEE);
+        expected.push_back(dst.buffer.back());
         EXPECT_EQ(QKImage_convert(&src.image, &dst.image), QK_OK);
         EXPECT_EQ(dst.buffer, expected);
     }
@@ -169,8 +155,7 @@ TEST(Convert, WorkedExamples) {
 // the luma on the source side, the destination side, or both. The destination
 // starts with the source's dimensions exchanged and must take them over.
 TEST(Convert, EveryPairMatchesThePlainReference) {
-    auto is_420 = [](uint32_t f) { return f == NV12 || f == NV21 || f == YV12 || f == QK_FORMAT_YUVP; };
-    auto needs_even = [&](uint32_t f) { return f == YUYV || f == QK_FORMAT_YVYU || is_420(f); };
+    auto needs_even = [](uint32_t f) { return f == YUYV || f == QK_FORMAT_YVYU || is_yuv420(f); };
     std::mt19937 random(2024);
     int conversions = 0;
     for (uint32_t from : kConvertibleFormats) {
@@ -179,16 +164,16 @@ TEST(Convert, EveryPairMatchesThePlainReference) {
                 if ((width % 2 != 0 || height % 2 != 0) && (needs_even(from) || needs_even(to))) continue;
                 for (int gaps = 0; gaps < 4; ++gaps) {
                     const bool srcGap = (gaps & 1) != 0, dstGap = (gaps & 2) != 0;
-                    if ((srcGap && !is_420(from)) || (dstGap && !is_420(to))) continue;
-                    SCOPED_TRACE(::testing::Message() << name_of(from) << " to " << name_of(to) << " at " << width
+                    if ((srcGap && !is_yuv420(from)) || (dstGap && !is_yuv420(to))) continue;
+                    SCOPED_TRACE(::testing::Message() << fourcc(from) << " to " << fourcc(to) << " at " << width
                                                       << "x" << height << ", chroma gaps " << gaps);
                     const uint32_t luma = static_cast<uint32_t>(width * height);
                     const uint32_t srcOffset = srcGap ? luma + 24 : 0, dstOffset = dstGap ? luma + 40 : 0;
                     const uint64_t srcBytes = srcGap ? srcOffset + luma / 2 : QKImage_requiredSize(width, height, from);
                     const uint64_t dstBytes =
                         (dstGap ? dstOffset + luma / 2 : QKImage_requiredSize(width, height, to)) + 16;
-                    TestImage src({from, width, height, srcBytes, srcGap ? srcBytes : 0, srcOffset});
-                    TestImage dst({to, height, width, dstBytes, dstBytes, dstOffset});
+                    Frame src({from, width, height, srcBytes, srcGap ? srcBytes : 0, srcOffset});
+                    Frame dst({to, height, width, dstBytes, dstBytes, dstOffset});
                     src.randomize(random);
                     dst.randomize(random);
                     const std::vector<uint8_t> expected = reference_conversion(src.image, dst.image, dstBytes);
@@ -205,7 +190,7 @@ TEST(Convert, EveryPairMatchesThePlainReference) {
 }
 
 TEST(CopyAndConvert, ReturnsANewConvertedImageOrNull) {
-    TestImage nv21({NV21, 4, 2, 12}), grey({GREY, 4, 2, 8}), expected({RGBA, 4, 2, 32});
+    Frame nv21({NV21, 4, 2, 12}), grey({GREY, 4, 2, 8}), expected({RGBA, 4, 2, 32});
     LogCapture log;
     EXPECT_EQ(QKImage_copyAndConvert(nullptr, RGBA), nullptr);
     EXPECT_EQ(QKImage_copyAndConvert(&nv21.image, JPEG), nullptr);
@@ -213,12 +198,11 @@ TEST(CopyAndConvert, ReturnsANewConvertedImageOrNull) {
     EXPECT_EQ(QKImage_copyAndConvert(&grey.image, D16), nullptr);
     EXPECT_TRUE(HasOneFailureReport(log, QK_ERROR_UNSUPPORTED, kEntryFile));
 
-    QKImage* copy = QKImage_copyAndConvert(&nv21.image, RGBA);
-    ASSERT_NE(copy, nullptr);
+    ImagePtr copy(QKImage_copyAndConvert(&nv21.image, RGBA));
+    ASSERT_TRUE(copy);
     EXPECT_EQ(std::make_tuple(copy->width, copy->height, copy->format, copy->isWrapped),
               std::make_tuple(4, 2, RGBA, 0u));
     EXPECT_EQ(std::vector<uint8_t>(copy->data, copy->data + 32), reference_conversion(nv21.image, expected.image, 32));
-    QKImage_destroy(copy);
 }
 
 }  // namespace

@@ -1,14 +1,18 @@
 // The row kernels: every faster variant against its reference kernel for
-// every layout it is chosen for, and their colour arithmetic against the
-// plain formulas over the whole input domain (all 2^24 RGB colours and all
-// 2^24 (Y, U, V)).
+// every layout it is chosen for, each row at the very end of its memory, and
+// their colour arithmetic against the plain formulas over the whole input
+// domain (all 2^24 RGB colours and all 2^24 (Y, U, V)).
 #include <gtest/gtest.h>
+#include <signal.h>
+#include <string.h>
+#include <sys/mman.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <functional>
+#include <memory>
 #include <random>
 #include <string>
-#include <tuple>
 #include <vector>
 
 #include "convert/reference_frame.h"
@@ -21,97 +25,142 @@ using qktest::formula_rgb_to_yuv;
 using qktest::formula_yuv_to_rgb;
 using namespace qk;
 
-// A kernel under test: the bytes it writes for `width` pixels, and a run of
-// its reference (true) or of the variant chosen for it (false) from `in`,
-// whose first 1024 bytes may hold luma and the next two 1024 U and V.
-struct Kernel {
-    std::string name;
-    std::function<size_t(int width)> out_bytes;
-    std::function<void(bool reference, int width, uint8_t* in, uint8_t* out)> run;
+// The rows of one run of a kernel, each at the very end of memory of its
+// own, before a page nobody may touch: a kernel that reads or writes one byte
+// past a row faults, in every build. Inputs are random, the same for the
+// reference and the variant; outputs start as 0xC3.
+class Rows {
+public:
+    explicit Rows(unsigned seed) : random_(seed) {}
+    ~Rows() {
+        for (auto [base, span] : maps_) munmap(base, span);
+    }
+    uint8_t* in(size_t bytes) { return std::generate_n(row(bytes), bytes, std::ref(random_)) - bytes; }
+    uint8_t* out(size_t bytes) {
+        outs_.emplace_back(static_cast<uint8_t*>(memset(row(bytes), 0xC3, bytes)), bytes);
+        return outs_.back().first;
+    }
+    // U and V rows of `count` samples `step` apart: two planes (1), one row
+    // of pairs (2), or in the pixel pairs of a packed 4:2:2 row (4: bytes 1, 3).
+    std::pair<uint8_t*, uint8_t*> chroma(bool output, int step, int count) {
+        auto row = [&](size_t bytes) { return output ? out(bytes) : in(bytes); };
+        if (step == 1) return {row(count), row(count)};
+        uint8_t* pairs = row(size_t(count) * step) + (step == 4);
+        return {pairs, pairs + step / 2};
+    }
+    std::vector<uint8_t> written() const {
+        std::vector<uint8_t> all;
+        for (auto [row, bytes] : outs_) all.insert(all.end(), row, row + bytes);
+        return all;
+    }
+
+private:
+    uint8_t* row(size_t bytes) {
+        const size_t page = size_t(sysconf(_SC_PAGESIZE)), span = (bytes + page - 1) / page * page + page;
+        void* base = mmap(nullptr, span, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+        if (base == MAP_FAILED || mprotect(static_cast<uint8_t*>(base) + span - page, page, PROT_NONE) != 0) abort();
+        maps_.emplace_back(base, span);
+        return static_cast<uint8_t*>(base) + span - page - bytes;
+    }
+    std::mt19937 random_;
+    std::vector<std::pair<void*, size_t>> maps_;
+    std::vector<std::pair<uint8_t*, size_t>> outs_;
 };
 
-std::vector<Kernel> every_kernel() {
-    std::vector<Kernel> all;
-    auto add = [&all](const std::string& name, auto out_bytes, auto run) { all.push_back({name, out_bytes, run}); };
+// A kernel under test: a run of its reference (true) or of the variant
+// chosen for it (false) over `width` pixels.
+using Run = std::function<void(bool reference, int width, Rows& rows)>;
+
+std::vector<std::pair<std::string, Run>> every_kernel() {
+    std::vector<std::pair<std::string, Run>> all;
     for (int s = 0; s < kRgbFormatCount; ++s) {
         const RgbLayout rgb = kFormats[s].rgb;
-        const std::string from = std::to_string(s);
-        add("grey to " + from, [=](int w) { return size_t(w) * rgb.bytesPerPixel; },
-            [=](bool ref, int w, uint8_t* in, uint8_t* out) {
-                (ref ? grey_to_rgb_row_reference : select_grey_to_rgb_row(s))(in, out, w, rgb);
-            });
+        const size_t bpp = size_t(rgb.bytesPerPixel);
+        const std::string from = kFormats[s].name;
+        all.emplace_back("GREY to " + from, [=](bool ref, int w, Rows& r) {
+            (ref ? grey_to_rgb_row_reference : select_grey_to_rgb_row(s))(r.in(w), r.out(w * bpp), w, rgb);
+        });
         for (int d = 0; d < kRgbFormatCount; ++d) {
             const RgbToRgbShape shape{rgb, kFormats[d].rgb};
-            add(from + " to " + std::to_string(d), [=](int w) { return size_t(w) * shape.dst.bytesPerPixel; },
-                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
-                    (ref ? rgb_to_rgb_row_reference : select_rgb_to_rgb_row(s, d))(in, out, w, shape);
-                });
+            all.emplace_back(from + " to " + kFormats[d].name, [=](bool ref, int w, Rows& r) {
+                (ref ? rgb_to_rgb_row_reference : select_rgb_to_rgb_row(s, d))(
+                    r.in(w * bpp), r.out(size_t(w) * shape.dst.bytesPerPixel), w, shape);
+            });
         }
         for (int step : {1, 2, 4}) {
             const RgbToYuvShape shape{rgb, step, step};
             const std::string name = from + " to step " + std::to_string(step);
             if (step != 4) {
-                add(name + " luma", [=](int w) { return size_t(w) * step; },
-                    [=](bool ref, int w, uint8_t* in, uint8_t* out) {
-                        (ref ? rgb_to_luma_row_reference : select_rgb_to_luma_row(s, step))(in, out, w, shape);
-                    });
+                all.emplace_back(name + " luma", [=](bool ref, int w, Rows& r) {
+                    (ref ? rgb_to_luma_row_reference : select_rgb_to_luma_row(s, step))(
+                        r.in(w * bpp), r.out(size_t(w) * step), w, shape);
+                });
             }
-            add(name + " chroma", [=](int w) { return size_t(w / 2) * 2 * step; },
-                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
-                    (ref ? rgb_to_chroma_row_reference : select_rgb_to_chroma_row(s, step))(
-                        in, out, out + w / 2 * step, w / 2, shape);
-                });
+            all.emplace_back(name + " chroma", [=](bool ref, int w, Rows& r) {
+                const uint8_t* in = r.in(w / 2 * 2 * bpp);
+                const auto [u, v] = r.chroma(true, step, w / 2);
+                (ref ? rgb_to_chroma_row_reference : select_rgb_to_chroma_row(s, step))(in, u, v, w / 2, shape);
+            });
         }
-        // Even widths only; one chroma pair whose pixels take the double path.
-        for (auto [lumaStepOf, chromaStepOf, rowsOf] : {std::tuple{1, 1, 2}, {1, 2, 2}, {2, 4, 1}}) {
-            // Structured bindings cannot be captured before C++20.
-            const int lumaStep = lumaStepOf, chromaStep = chromaStepOf, rows = rowsOf;
+        // Planar and semi-planar 4:2:0 (two luma rows over one chroma row)
+        // and packed 4:2:2, even widths only. The second chroma pair takes
+        // the double path.
+        for (int chromaStep : {1, 2, 4}) {
+            const int lumaStep = chromaStep == 4 ? 2 : 1, rows = 3 - lumaStep;
             const YuvToRgbShape shape{lumaStep, chromaStep, rows, rgb};
-            add("YUV step " + std::to_string(chromaStep) + " to " + from,
-                [=](int w) { return size_t(w / 2) * 4 * rgb.bytesPerPixel; },
-                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
-                    const int even = w / 2 * 2;
-                    in[1024 + chromaStep] = 28, in[2048 + chromaStep] = 228;
-                    (ref ? yuv_to_rgb_row_reference : select_yuv_to_rgb_row(s, lumaStep, chromaStep, rows))(
-                        in, rows == 2 ? in + even : nullptr, in + 1024, in + 2048, out,
-                        rows == 2 ? out + even * rgb.bytesPerPixel : nullptr, even, shape);
-                });
+            all.emplace_back("YUV step " + std::to_string(chromaStep) + " to " + from, [=](bool ref, int w, Rows& r) {
+                const int even = w / 2 * 2;
+                uint8_t* y0 = r.in(size_t(even) * lumaStep);
+                uint8_t* y1 = rows == 2 ? r.in(even) : nullptr;
+                auto [u, v] = rows == 2 ? r.chroma(false, chromaStep, even / 2) : std::pair{y0 + 1, y0 + 3};
+                if (even >= 4) u[chromaStep] = 28, v[chromaStep] = 228;
+                uint8_t* d0 = r.out(even * bpp);
+                uint8_t* d1 = rows == 2 ? r.out(even * bpp) : nullptr;
+                (ref ? yuv_to_rgb_row_reference : select_yuv_to_rgb_row(s, lumaStep, chromaStep, rows))(
+                    y0, y1, u, v, d0, d1, even, shape);
+            });
         }
     }
     for (int from : {1, 2, 4}) {
         for (int to : {1, 2, 4}) {
             const std::string name = std::to_string(from) + " to " + std::to_string(to);
             if (from != 4 && to != 4) {
-                add("samples " + name, [=](int w) { return size_t(w) * to; },
-                    [=](bool ref, int w, uint8_t* in, uint8_t* out) {
-                        (ref ? sample_row_reference : select_sample_row(from, to))(in, from, out, to, w);
-                    });
+                all.emplace_back("samples " + name, [=](bool ref, int w, Rows& r) {
+                    (ref ? sample_row_reference : select_sample_row(from, to))(
+                        r.in(size_t(w) * from), from, r.out(size_t(w) * to), to, w);
+                });
             }
             // V before U on the source side, U before V on the other.
-            add("chroma " + name, [=](int w) { return size_t(w) * 2 * to; },
-                [=](bool ref, int w, uint8_t* in, uint8_t* out) {
-                    const ChromaRow row = ref ? chroma_row_reference : select_chroma_row(from, to);
-                    row(in + 1, in, from, out, out + w * to, to, w);
-                });
+            all.emplace_back("chroma " + name, [=](bool ref, int w, Rows& r) {
+                const auto [v, u] = r.chroma(false, from, w);
+                const auto [du, dv] = r.chroma(true, to, w);
+                (ref ? chroma_row_reference : select_chroma_row(from, to))(u, v, from, du, dv, to, w);
+            });
         }
     }
     return all;
 }
 
-// Same random input, widths that leave tails, and 16 guard bytes after the
-// output that neither kernel may touch.
-TEST(RowVariants, EveryVariantWritesExactlyTheBytesOfItsReference) {
-    std::mt19937 random(1);
-    for (const Kernel& kernel : every_kernel()) {
-        for (int width : {0, 1, 2, 7, 8, 17, 34, 67}) {
-            std::vector<uint8_t> in(3072);
-            for (uint8_t& byte : in) byte = static_cast<uint8_t>(random());
-            std::vector<uint8_t> want(kernel.out_bytes(width) + 16, 0xC3), got = want;
-            kernel.run(true, width, in.data(), want.data());
-            kernel.run(false, width, in.data(), got.data());
-            EXPECT_EQ(got, want) << kernel.name << ", width " << width;
+// What a fault says: the kernel and width that ran past a row.
+std::string running;
+extern "C" void report_fault(int) {
+    write(2, running.data(), running.size());
+    _exit(1);
+}
+
+// Every width up to 67: tails of every length.
+TEST(RowVariants, EveryVariantWritesExactlyTheBytesOfItsReferenceWithinItsRows) {
+    signal(SIGSEGV, report_fault);
+    for (const auto& [name, run] : every_kernel()) {
+        for (int width = 0; width <= 67; ++width) {
+            running = name + ", width " + std::to_string(width) + ": a row was overrun\n";
+            Rows reference{unsigned(width)}, variant{unsigned(width)};
+            run(true, width, reference);
+            run(false, width, variant);
+            EXPECT_EQ(variant.written(), reference.written()) << name << ", width " << width;
         }
     }
+    signal(SIGSEGV, SIG_DFL);
 }
 
 TEST(Exhaustive, RgbToYuvGivesTheFormulaForEveryColour) {

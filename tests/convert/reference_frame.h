@@ -1,28 +1,22 @@
 // The yardsticks of the conversion tests: the colour formulas written out
 // plainly (deliberately independent of src/convert: division and floor where
-// the library uses shifts and tables), test images over buffers of their own,
-// and a pixel-by-pixel reference conversion of whole images, with every
-// format's byte positions spelled out rather than taken from the library's
-// layout tables.
+// the library uses shifts and tables), and a pixel-by-pixel reference
+// conversion of whole images, with every format's byte positions spelled out
+// rather than taken from the library's layout tables.
 #ifndef QKCORE_TESTS_CONVERT_REFERENCE_FRAME_H
 #define QKCORE_TESTS_CONVERT_REFERENCE_FRAME_H
 
 #include <math.h>
 #include <stdint.h>
 
-#include <random>
 #include <vector>
 
 #include "qkcore/qk_image.h"
 
 namespace qktest {
 
-struct Rgb {
-    int r, g, b;
-};
-struct Yuv {
-    int y, u, v;
-};
+struct Rgb { int r, g, b; };
+struct Yuv { int y, u, v; };
 
 inline int clamp255(int value) { return value < 0 ? 0 : (value > 255 ? 255 : value); }
 
@@ -40,31 +34,6 @@ inline Rgb formula_yuv_to_rgb(int luma, int u_byte, int v_byte) {
     return {clamp255(static_cast<int>(y + rv)), clamp255(static_cast<int>((y - gu) - gv)),
             clamp255(static_cast<int>(y + bu))};
 }
-
-struct ImageSpec {
-    uint32_t format;
-    int32_t width, height;
-    size_t bytes;  // buffer length; 0: no buffer
-    uint64_t size = 0;
-    uint32_t chromaOffset = 0;
-};
-
-// A QKImage wrapping a vector of `bytes` patterned bytes; `size` and
-// `chromaOffset` are recorded as given.
-struct TestImage {
-    explicit TestImage(const ImageSpec& spec) : buffer(spec.bytes) {
-        for (size_t i = 0; i < spec.bytes; ++i) buffer[i] = static_cast<uint8_t>(i * 7 + 3);
-        image.width = spec.width, image.height = spec.height, image.format = spec.format;
-        image.data = buffer.empty() ? nullptr : buffer.data();
-        image.isWrapped = 1, image.size = spec.size, image.chromaOffset = spec.chromaOffset;
-    }
-    TestImage(const TestImage&) = delete;
-    void randomize(std::mt19937& random) {
-        for (uint8_t& byte : buffer) byte = static_cast<uint8_t>(random());
-    }
-    std::vector<uint8_t> buffer;
-    QKImage image;
-};
 
 // The formats that convert to each other.
 extern const uint32_t kConvertibleFormats[13];

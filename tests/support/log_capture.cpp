@@ -7,17 +7,25 @@
 #include <map>
 
 namespace qktest {
+namespace {
 
-LogCapture* LogCapture::active_ = nullptr;
+LogCapture* active = nullptr;
 
-LogCapture::LogCapture() : previous_(active_), saved_hook_(HX_LogMsg) {
-    active_ = this;
+// Whether `text` continues after `at` with one or more decimal digits only.
+bool digits_from(const std::string& text, size_t at) {
+    return at < text.size() && text.find_first_not_of("0123456789", at) == std::string::npos;
+}
+
+}  // namespace
+
+LogCapture::LogCapture() : previous_(active), saved_hook_(HX_LogMsg) {
+    active = this;
     HX_LogMsg = capture;
 }
 
 LogCapture::~LogCapture() {
     HX_LogMsg = saved_hook_;
-    active_ = previous_;
+    active = previous_;
 }
 
 int LogCapture::capture(int level, ...) {
@@ -27,7 +35,7 @@ int LogCapture::capture(int level, ...) {
     char text[4096];
     vsnprintf(text, sizeof(text), format, args);
     va_end(args);
-    if (active_ != nullptr) active_->lines_.push_back({level, text});
+    if (active != nullptr) active->lines_.push_back({level, text});
     return 0;
 }
 
@@ -40,18 +48,8 @@ std::vector<std::string> LogCapture::texts(int level) const {
 }
 
 bool LogCapture::contains(int level, const std::string& text) const {
-    const std::vector<std::string> all = texts(level);
-    return std::find(all.begin(), all.end(), text) != all.end();
+    return std::find(lines_.begin(), lines_.end(), LogLine{level, text}) != lines_.end();
 }
-
-namespace {
-
-// Whether `text` continues after `at` with one or more decimal digits only.
-bool digits_from(const std::string& text, size_t at) {
-    return at < text.size() && text.find_first_not_of("0123456789", at) == std::string::npos;
-}
-
-}  // namespace
 
 // A failure report is a level-4 line "NAME (VALUE): FILE:LINE".
 ::testing::AssertionResult HasOneFailureReport(const LogCapture& log, int32_t status, const char* file) {

@@ -25,8 +25,6 @@ public:
     LogCapture();
     ~LogCapture();
     LogCapture(const LogCapture&) = delete;
-    LogCapture& operator=(const LogCapture&) = delete;
-
     const std::vector<LogLine>& lines() const { return lines_; }
     std::vector<std::string> texts(int level) const;
     bool contains(int level, const std::string& text) const;
@@ -34,7 +32,6 @@ public:
 
 private:
     static int capture(int level, ...);
-    static LogCapture* active_;
     LogCapture* previous_;
     QKLogFn saved_hook_;
     std::vector<LogLine> lines_;
