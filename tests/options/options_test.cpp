@@ -6,6 +6,7 @@
 #include <math.h>
 
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "options/registry.h"
@@ -66,58 +67,42 @@ TEST(OptionRegister, FreshKeysAndMessages) {
     EXPECT_EQ(QKOption_FindByName("iso"), &iso);
 }
 
-// Same name and type: the earlier record's key, and nothing is added. Same
-// name, another type: a key and a record of its own; lookups by name find the
-// smaller key.
-TEST(OptionRegister, AssignsKeysAndSharesThemWithDuplicates) {
-    static QKOption_t first = {0, "reg.sharpness", QK_OPTION_INTEGER, 0, 10, nullptr};
-    static QKOption_t second = {0, "reg.contrast", QK_OPTION_INTEGER, 0, 10, nullptr};
-    static QKOption_t again = {0, "reg.sharpness", QK_OPTION_INTEGER, 5, 6, nullptr};
-    static QKOption_t as_float = {0, "reg.sharpness", QK_OPTION_FLOAT, 0.0f, 1.0f, nullptr};
-    ASSERT_EQ(QKOption_RegisterNew(&first) + QKOption_RegisterNew(&second), 2);
-    EXPECT_EQ(second.key, first.key + 1);
+// Keys count up; a duplicate (same name and type) gets the earlier key and
+// adds nothing; another type a key and record of its own, lookups by name
+// finding the smaller key. A key already present is refused, fixed or drawn
+// (the record keeping the key it was given); a fixed key skips the name
+// check. Lookups that find nothing, and a null record, say nothing.
+TEST(OptionRegister, KeysDuplicatesAndLookups) {
+    static QKOption_t first = {0, "reg.sharp", QK_OPTION_INTEGER, 0, 10, nullptr}, again = first,
+                      second = {0, "reg.contrast", QK_OPTION_INTEGER, 0, 10, nullptr},
+                      as_float = {0, "reg.sharp", QK_OPTION_FLOAT, 0.0f, 1.0f, nullptr},
+                      fixed = {0x51000010, "reg.fixed", QK_OPTION_STRING, 0, 0, nullptr}, clash = fixed,
+                      twin = {0x51000012, "reg.fixed", QK_OPTION_STRING, 0, 0, nullptr};
+    ASSERT_EQ(QKOption_RegisterNew(&first) + QKOption_RegisterNew(&second) + QKOption_RegisterNew(&fixed), 3);
     const size_t registered = qk::options::option_register().size();
     EXPECT_EQ(QKOption_RegisterNew(&again), 1);
-    EXPECT_EQ(again.key, first.key);
-    EXPECT_EQ(qk::options::option_register().size(), registered);
-    EXPECT_EQ(QKOption_RegisterNew(&as_float), 1);
-    EXPECT_EQ(as_float.key, second.key + 1);
-    EXPECT_EQ(QKOption_FindById(as_float.key), &as_float);
-    EXPECT_EQ(QKOption_FindById(first.key), &first);
-    EXPECT_EQ(QKOption_FindByName("reg.sharpness"), &first);
-    EXPECT_EQ(QKOption_FindIdByName("reg.sharpness"), first.key);
-    EXPECT_STREQ(QKOption_FindNameById(second.key), "reg.contrast");
-}
-
-// A key already present is refused, whether fixed by the caller or drawn
-// (the record keeps the key it was given); a fixed key skips the name check.
-TEST(OptionRegister, RefusesKeysAlreadyPresent) {
-    static QKOption_t fixed = {0x51000010, "reg.fixed", QK_OPTION_STRING, 0, 0, nullptr};
-    static QKOption_t clash = {0x51000010, "reg.clash", QK_OPTION_STRING, 0, 0, nullptr};
-    static QKOption_t twin = {0x51000012, "reg.fixed", QK_OPTION_STRING, 0, 0, nullptr};
-    ASSERT_EQ(QKOption_RegisterNew(&fixed), 1);
+    EXPECT_EQ(std::make_tuple(second.key, again.key, qk::options::option_register().size()),
+              std::make_tuple(first.key + 1, first.key, registered));
+    EXPECT_EQ(QKOption_RegisterNew(&as_float) + QKOption_RegisterNew(&twin), 2);
     EXPECT_EQ(QKOption_RegisterNew(&clash), 0);
-    EXPECT_EQ(QKOption_FindById(0x51000010), &fixed);
-    EXPECT_EQ(QKOption_FindByName("reg.clash"), nullptr);
-    clash.key = 0x51000011;
-    EXPECT_EQ(QKOption_RegisterNew(&clash) + QKOption_RegisterNew(&twin), 2);
-    EXPECT_EQ(QKOption_FindById(0x51000012), &twin);
-    EXPECT_EQ(QKOption_FindByName("reg.fixed"), &fixed);
-
+    EXPECT_EQ(as_float.key, second.key + 1);
     const int32_t next = qk::options::draw_key() + 1;
-    static QKOption_t taken = {next, "reg.taken", QK_OPTION_STRING, 0, 0, nullptr};
-    static QKOption_t unlucky = {0, "reg.unlucky", QK_OPTION_STRING, 0, 0, nullptr};
-    ASSERT_EQ(QKOption_RegisterNew(&taken), 1);
-    EXPECT_EQ(QKOption_RegisterNew(&unlucky), 0);
+    static QKOption_t taken = {next, "reg.taken", QK_OPTION_STRING, 0, 0, nullptr}, unlucky = {};
+    unlucky.name = "reg.unlucky";
+    EXPECT_EQ(QKOption_RegisterNew(&taken) * 10 + QKOption_RegisterNew(&unlucky), 10);
     EXPECT_EQ(unlucky.key, next);
-    EXPECT_EQ(QKOption_FindById(next), &taken);
-
-    // No record: nothing said. Lookups that find nothing say nothing.
+    const struct { int32_t key; const QKOption_t* record; } by_key[] = {
+        {first.key, &first}, {as_float.key, &as_float}, {0x51000010, &fixed}, {0x51000012, &twin}, {next, &taken},
+        {0x0badf00d, nullptr}};
+    for (const auto& k : by_key) EXPECT_EQ(QKOption_FindById(k.key), k.record) << std::hex << k.key;
+    EXPECT_EQ(QKOption_FindByName("reg.sharp"), &first);
+    EXPECT_EQ(QKOption_FindByName("reg.fixed"), &fixed);
+    EXPECT_EQ(QKOption_FindIdByName("reg.sharp"), first.key);
+    EXPECT_STREQ(QKOption_FindNameById(second.key), "reg.contrast");
     qktest::LogCapture log;
     EXPECT_EQ(QKOption_RegisterNew(nullptr), 0);
-    EXPECT_EQ(QKOption_FindByName("reg.FIXED"), nullptr);  // letter case counts
+    EXPECT_EQ(QKOption_FindByName("reg.SHARP"), nullptr);  // letter case counts
     EXPECT_EQ(QKOption_FindIdByName("reg.unknown") + QKOption_FindIdByName(nullptr), 0);
-    EXPECT_EQ(QKOption_FindById(0x0badf00d), nullptr);
     EXPECT_EQ(QKOption_FindNameById(0x0badf00d), nullptr);
     EXPECT_TRUE(log.lines().empty());
 }
