@@ -204,7 +204,8 @@ TEST(Picture, DecodesEachFormatWithinTheLimit) {
         {"jpeg", encode(Bytes(16 * 8, 90), 16, 8, QK_FORMAT_GREY), grey, 16, 1},
         {"png palette+tRNS", png_of(2, 1, SPNG_COLOR_TYPE_INDEXED, {0, 1}), {10, 20, 30, 128, 200, 100, 50, 255}, 2, 0},
         {"webp lossless", webp_of(translucent, 2, 2), translucent, 2, 0},
-        {"gif interlaced", gif_of(4, 8, 1, 2, 3, 6, true), screen, 4, 0}, {"gif", gif_of(4, 8, 1, 2, 3, 6), screen, 4, 0},
+        {"gif interlaced", gif_of(4, 8, 1, 2, 3, 6, true), screen, 4, 0},
+        {"gif", gif_of(4, 8, 1, 2, 3, 6), screen, 4, 0},
     };
     for (const auto& c : cases) {
         qk::platform::Bitmap bitmap;
@@ -241,8 +242,9 @@ TEST(Picture, BadPicturesAreRefusedAndLeaveTheTarget) {
     };
     testing::internal::CaptureStderr();
     for (const auto& c : cases) {
-        ImagePtr target(c.status == QK_ERROR_INVALID_SIZE ? QKImage_createWrap(small.data(), 2, 2, QK_FORMAT_YUYV, 16, 0)
-                                                          : QKImage_createEmpty(0, 0, QK_FORMAT_RGBA));
+        const bool yuyv = c.status == QK_ERROR_INVALID_SIZE;
+        ImagePtr target(yuyv ? QKImage_createWrap(small.data(), 2, 2, QK_FORMAT_YUYV, 16, 0)
+                             : QKImage_createEmpty(0, 0, QK_FORMAT_RGBA));
         const auto before = snapshot(target.get());
         LogCapture log;
         EXPECT_EQ(QKImage_decodeFromJpeg(target.get(), c.file.data(), c.file.size()), c.status) << c.name;

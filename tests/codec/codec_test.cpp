@@ -34,8 +34,7 @@ const std::string& kDir = kScratch.path;
 
 bool module_loaded() {
     void* handle = dlopen("libveljpeginterface.so", RTLD_NOW | RTLD_NOLOAD);
-    if (handle != nullptr) dlclose(handle);
-    return handle != nullptr;
+    return handle != nullptr && dlclose(handle) == 0;
 }
 Bytes read_file(const std::string& path) {
     std::ifstream file(path, std::ios::binary);
@@ -129,8 +128,7 @@ TEST(CodecStandIn, DecodeTakesTheCodecsBufferOrFallsBack) {
 
 // The first of ".jpeg", ".jpg", ".png" anywhere in the path decides, letter
 // case ignored; else the buffer is written as it is, over an older, longer
-// file. JPEG encoding and file errors are only logged; PNG refusals come with
-// a status and leave no file.
+// file. PNG refusals come with a status and leave no file.
 TEST(CodecStandIn, SaveChoosesTheFileKindByPath) {
     ImagePtr image = distinct_image(4, 2, QK_FORMAT_RGBA);
     const Bytes pixels(image->data, image->data + 32), png = {0x89, 'P', 'N', 'G'}, stream(6);
@@ -147,12 +145,9 @@ TEST(CodecStandIn, SaveChoosesTheFileKindByPath) {
         EXPECT_TRUE(&c.starts != &pixels || bytes.size() == 32);
         EXPECT_EQ(std::make_pair(calls.encodes, calls.quality), std::make_pair(c.encodes, c.encodes * 85));
     }
-    LogCapture log;
-    for (const char* name : {"missing/x.raw", "missing/x.jpg"}) {
-        EXPECT_EQ(QKImage_saveToFile(image.get(), (kDir + name).c_str(), 90), QK_OK);
-        EXPECT_TRUE(log.contains(4, "failed to create file: No such file or directory")) << name;
-        log.clear();
-    }
+    LogCapture log;  // a file that cannot be made is only logged, but for PNG
+    EXPECT_EQ(QKImage_saveToFile(image.get(), (kDir + "missing/x.jpg").c_str(), 90), QK_OK);
+    EXPECT_TRUE(log.contains(4, "failed to create file: No such file or directory"));
     ImagePtr flat(QKImage_createWrap(image->data, 0, 2, QK_FORMAT_NV21, 0, 0));
     const struct { const QKImage* image; const char* name; int32_t status; int errors; } refusals[] = {
         {nullptr, "a.png", QK_ERROR_NULL_PARAM, 1}, {image.get(), nullptr, QK_ERROR_NULL_PARAM, 1},
@@ -170,7 +165,8 @@ TEST(CodecStandIn, SaveChoosesTheFileKindByPath) {
 // describes them, never when they are shorter than what it describes. An
 // owned earlier buffer is freed when the file's takes its place.
 TEST(CodecStandIn, LoadTakesRawFilesTheImageDescribes) {
-    const struct { int bytes; int32_t w; uint32_t format; uint64_t size; int32_t status; } cases[] = {  // bytes -1: none
+    // bytes -1: no file.
+    const struct { int bytes; int32_t w; uint32_t format; uint64_t size; int32_t status; } cases[] = {
         {-1, 16, QK_FORMAT_NV21, 0, QK_ERROR_IO_FAILED},     {0, 16, QK_FORMAT_NV21, 0, QK_ERROR_IO_FAILED},
         {192, 16, QK_FORMAT_NV21, 0, QK_OK},                 {191, 16, QK_FORMAT_NV21, 0, QK_ERROR_INVALID_SIZE},
         {300, 16, QK_FORMAT_NV21, 250, QK_OK},               {249, 16, QK_FORMAT_NV21, 250, QK_ERROR_INVALID_SIZE},

@@ -50,7 +50,9 @@ TEST(Convert, RefusalsLeaveTheDestinationsBytesAsTheyWere) {
         {"RGBA to D16", {RGBA, 4, 2, 256}, {D16, 2, 2, 256, 256}, NONE},
         {"JPEG to NV12", {JPEG, 4, 2, 256, 100}, {NV12, 2, 2, 256, 256}, NONE},
     };
-    auto name = [](const ImageSpec& s) { return std::to_string(s.width) + "x" + std::to_string(s.height) + " " + fourcc(s.format, true); };
+    auto name = [](const ImageSpec& s) {
+        return std::to_string(s.width) + "x" + std::to_string(s.height) + " " + fourcc(s.format, true);
+    };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         Frame src(c.src), dst(c.dst);

@@ -56,27 +56,15 @@ TEST(Rotate, EveryAngleMapsEveryPixel) {
     }
 }
 
-// Other formats turn through RGBA: the result is exactly converting to RGBA,
-// turning that, and converting back into the same buffer.
-TEST(Rotate, OtherFormatsEqualConvertTurnConvertBack) {
-    const struct { uint32_t format; int32_t width, height, angle; } cases[] = {
-        {QK_FORMAT_NV21, 16, 8, 270}, {QK_FORMAT_NV12, 6, 4, 90}, {QK_FORMAT_YV12, 8, 4, -90},
-        {QK_FORMAT_YUVP, 4, 4, 180},  {QK_FORMAT_YUYV, 8, 4, 90}, {QK_FORMAT_GREY, 5, 3, 90},
-        {QK_FORMAT_BGR8, 7, 2, 270},  {QK_FORMAT_ABGR, 3, 3, 180},
-    };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(fourcc(c.format));
-        ImagePtr image = distinct_image(c.width, c.height, c.format), expected(QKImage_clone(image.get()));
-        ImagePtr rgba(QKImage_copyAndConvert(image.get(), QK_FORMAT_RGBA));
-        ASSERT_EQ(QKImage_rotate(rgba.get(), c.angle), QK_OK);
-        ASSERT_EQ(QKImage_convert(rgba.get(), expected.get()), QK_OK);
-        LogCapture log;
-        ASSERT_EQ(QKImage_rotate(image.get(), c.angle), QK_OK);
-        EXPECT_EQ(std::make_pair(log.texts(3).size(), log.texts(4).size()), std::make_pair(size_t{1}, size_t{0}));
-        EXPECT_EQ(std::make_tuple(image->format, image->width, image->height),
-                  std::make_tuple(c.format, expected->width, expected->height));
-        EXPECT_EQ(memcmp(image->data, expected->data, QKImage_size(expected.get())), 0);
-    }
+// Other formats turn through RGBA: exactly converting, turning the RGBA copy
+// and converting back into the same buffer.
+TEST(Rotate, OtherFormatsThroughRgba) {
+    ImagePtr nv21 = distinct_image(16, 8, QK_FORMAT_NV21), expected(QKImage_clone(nv21.get()));
+    ImagePtr rgba(QKImage_copyAndConvert(nv21.get(), QK_FORMAT_RGBA));
+    ASSERT_EQ(QKImage_rotate(rgba.get(), 270) | QKImage_convert(rgba.get(), expected.get()), QK_OK);
+    ASSERT_EQ(QKImage_rotate(nv21.get(), 270), QK_OK);
+    EXPECT_EQ(std::make_tuple(nv21->format, nv21->width, nv21->height), std::make_tuple(QK_FORMAT_NV21, 8, 16));
+    EXPECT_EQ(memcmp(nv21->data, expected->data, 192), 0);
 }
 
 // Each output pixel copies the source pixel under its centre, worked out by
@@ -190,22 +178,6 @@ TEST(Draw, IntoItself) {
     }
 }
 
-// Being outside is decided before the format is looked at.
-TEST(Draw, NothingToDrawIsNotAFailure) {
-    const std::string out = "In QKImage_drawImage, the source image 4x4 is completely out of the destination 5x3 at ";
-    const struct { uint32_t format; int32_t x, y; std::string message; } cases[] = {
-        {QK_FORMAT_RGBA, INT32_MIN, 0, out + "-2147483648,0"}, {QK_FORMAT_GREY, 0, 3, out + "0,3"},
-        {QK_FORMAT_RGBA, -4, 0, "Nothing to draw (lines = 3, cols = 0)"}};
-    for (const auto& c : cases) {
-        ImagePtr src = distinct_image(4, 4, c.format), dst = distinct_image(5, 3, c.format, 200);
-        const auto before = snapshot(dst.get());
-        LogCapture log;
-        EXPECT_EQ(QKImage_drawImage(src.get(), dst.get(), c.x, c.y), QK_OK);
-        EXPECT_EQ(log.lines(), (std::vector<LogLine>{{3, c.message}}));
-        EXPECT_TRUE(snapshot(dst.get()) == before);
-    }
-}
-
 // Every refusal: its status, its one failure report (from the operation's
 // own file unless a step it relies on reports), any message that goes with
 // it, and the caller's images left as they were.
@@ -221,7 +193,8 @@ struct Spec { uint32_t format; int32_t w, h; uint64_t size = 0; int buffer = kBu
 
 ImagePtr make(const Spec& spec, std::vector<uint8_t>& bytes) {
     if (spec.buffer == kNullImage) return nullptr;
-    ImagePtr image(QKImage_createWrap(spec.buffer ? bytes.data() : nullptr, spec.w, spec.h, spec.format, 0, spec.chroma));
+    uint8_t* buffer = spec.buffer ? bytes.data() : nullptr;
+    ImagePtr image(QKImage_createWrap(buffer, spec.w, spec.h, spec.format, 0, spec.chroma));
     image->size = spec.size;
     return image;
 }
@@ -259,9 +232,11 @@ TEST(GeometryRefusals, ReportOnceAndLeaveTheImagesAlone) {
         {kScale, rgba2, {NV12, 2, 2, 0, kNone}, 0, 0, PARAM, nullptr, kScaleFormat},
         {kScale, rgba2, {RGBA, 2, 2, 12}, 0, 0, SIZE}, {kScale, rgba2, {RGBA, 2, 2, 12, kNone}, 0, 0, SIZE},
         {kScale, {RGBA, 2, 2, 12}, none2, 0, 0, SIZE},
-        {kScale, rgba2, {RGBA, 40000, 40000, 0, kNone}, 0, 0, PARAM, kImageFile, "QKImage_scale: allocation failed (0 bytes)"},
+        {kScale, rgba2, {RGBA, 40000, 40000, 0, kNone}, 0, 0, PARAM, kImageFile,
+         "QKImage_scale: allocation failed (0 bytes)"},
 
-        {kCrop, null, rgba2, 0, 0, NUL}, {kCrop, rgba2, null, 0, 0, NUL}, {kCrop, {RGBA, 4, 4, 64, kNone}, none2, 0, 0, NUL},
+        {kCrop, null, rgba2, 0, 0, NUL}, {kCrop, rgba2, null, 0, 0, NUL},
+        {kCrop, {RGBA, 4, 4, 64, kNone}, none2, 0, 0, NUL},
         {kCrop, {RGBA, 0, 4}, none2, 0, 0, SIZE}, {kCrop, {RGBA, 4, 4, 60}, none2, 0, 0, SIZE},
         {kCrop, rgba4, {QK_FORMAT_BGRA, 2, 2, 0, kNone}, 0, 0, PARAM}, {kCrop, rgba4, none2, -1, 0, SIZE},
         {kCrop, rgba4, none2, 3, 0, SIZE}, {kCrop, rgba4, none2, INT32_MAX, 0, SIZE}, {kCrop, rgba4, none2, 0, 3, SIZE},

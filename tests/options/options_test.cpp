@@ -19,9 +19,9 @@ using Lines = std::vector<qktest::LogLine>;
 
 const QKOptionEnum_t kFlash[] = {{0, "auto"}, {1, "on"}, {7, "off"}, {QK_OPTION_ENUM_END, nullptr}};
 const QKOptionEnum_t kNoValues[] = {{QK_OPTION_ENUM_END, "unused"}};
-QKOption_t iso = {0, "iso", QK_OPTION_INTEGER, 100, 3200, nullptr}, ev = {-5, "ev", QK_OPTION_FLOAT, -2.0f, 2.5f, nullptr};
-QKOption_t iso_again = {0, "iso", QK_OPTION_INTEGER, 5, 6, nullptr}, clash = {-5, "clash", QK_OPTION_STRING, 0, 0, nullptr};
-QKOption_t nameless = {0, nullptr, QK_OPTION_INTEGER, 0, 0, nullptr}, flash = {0, "flash", QK_OPTION_ENUM, 0, 0, kFlash};
+QKOption_t iso = {0, "iso", QK_OPTION_INTEGER, 100, 3200, nullptr}, ev = {-5, "ev", QK_OPTION_FLOAT, -2.f, 2.5f, 0};
+QKOption_t iso_again = {0, "iso", QK_OPTION_INTEGER, 5, 6, nullptr}, clash = {-5, "clash", QK_OPTION_STRING, 0, 0, 0};
+QKOption_t nameless = {0, nullptr, QK_OPTION_INTEGER, 0, 0, 0}, flash = {0, "flash", QK_OPTION_ENUM, 0, 0, kFlash};
 QKOption_t tag = {0, "tag", QK_OPTION_STRING, 0, 0, nullptr}, scene = {0, "scene", QK_OPTION_ENUM, 0, 0, nullptr};
 QKOption_t effect = {0, "effect", QK_OPTION_ENUM, 0, 0, kNoValues}, odd = {0x7fffffff, "odd", 4, 0, 0, nullptr};
 QKOption_t last = {0, "last", QK_OPTION_STRING, 0, 0, nullptr};
@@ -126,7 +126,8 @@ TEST(OptionValues, EachCheckOnItsOwnType) {
             << "case " << &c - ranges;
     }
     const QKOptionEnum_t modes[] = {{0, "auto"}, {1, "on"}, {2, "off"}, {QK_OPTION_ENUM_END, "never read"}};
-    const QKOptionEnum_t empty[] = {{QK_OPTION_ENUM_END, "auto"}}, unnamed[] = {{0, nullptr}, {QK_OPTION_ENUM_END, nullptr}};
+    const QKOptionEnum_t empty[] = {{QK_OPTION_ENUM_END, "auto"}};
+    const QKOptionEnum_t unnamed[] = {{0, nullptr}, {QK_OPTION_ENUM_END, nullptr}};
     QKOption_t choice = {0, "e", QK_OPTION_ENUM, 0, 0, modes};
     for (const char* value : {"auto", "on", "off"}) EXPECT_EQ(QKOption_CheckValueS(&choice, value), 1) << value;
     for (const char* value : {"ON", "of", "", "never read", static_cast<const char*>(nullptr)}) {

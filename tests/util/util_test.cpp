@@ -35,7 +35,8 @@ TEST(Log, LevelTagsOnStandardOutputPrioritiesInTheSystemLog) {
     ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&address), sizeof(address)), 0);
     qk::platform::set_system_log_socket_for_testing(path.c_str());
     const struct { int level; const char* tag; int priority; } cases[] = {
-        {0, "[V]", 15}, {1, "[D]", 15}, {2, "[I]", 14}, {3, "[W]", 12}, {4, "[E]", 11}, {7, "[V]", 15}, {-1, "[V]", 15}};
+        {0, "[V]", 15}, {1, "[D]", 15}, {2, "[I]", 14}, {3, "[W]", 12}, {4, "[E]", 11}, {7, "[V]", 15},
+        {-1, "[V]", 15}};
     for (const auto& c : cases) {
         for (auto log : {DefaultLogMsg, AndroidLogMsg}) {
             testing::internal::CaptureStdout();
@@ -110,7 +111,9 @@ TEST(Sort, OrdersTheRangeDescendingAndMovesNamesByContent) {
         std::vector<int32_t> keys = c.keys;
         std::vector<std::vector<char>> buffers(keys.size(), std::vector<char>(256, '\x7f'));
         std::vector<char*> names;
-        for (size_t i = 0; i < keys.size(); ++i) names.push_back(strcpy(buffers[i].data(), std::to_string(keys[i]).c_str()));
+        for (size_t i = 0; i < keys.size(); ++i) {
+            names.push_back(strcpy(buffers[i].data(), std::to_string(keys[i]).c_str()));
+        }
         const std::vector<char*> pointers = names;
         sort(keys.data(), names.data(), c.first, c.last);
         EXPECT_EQ(keys, c.sorted);
