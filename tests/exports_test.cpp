@@ -16,7 +16,7 @@ using Names = std::set<std::string>;
 // kind give one name), without version nodes.
 Names exported(const std::string& file) {
     Names names;
-    FILE* nm = popen(("nm -D --defined-only --demangle " + file).c_str(), "r");
+    FILE* nm = popen((QK_NM " -D --defined-only --demangle " + file).c_str(), "r");  // the toolchain's nm
     char type, name[512];
     while (nm != nullptr && fscanf(nm, "%*s %c %511[^\n]", &type, name) == 2) {
         if (type != 'A') names.insert(std::string(name).substr(0, std::string(name).find('@')));
