@@ -7,10 +7,14 @@
 #include <benchmark/benchmark.h>
 #include <ctype.h>
 #include <stdint.h>
+#include <stdlib.h>
+#include <string.h>
 
+#include <random>
 #include <string>
 
 #include "image/format.h"
+#include "qkcore/qk_image.h"
 #include "qkcore/qk_log.h"
 
 namespace qkbench {
@@ -45,6 +49,43 @@ benchmark::internal::Benchmark* register_for_format(const char* name, uint32_t f
     const std::string full = std::string(name) + "/" + format_label(format) + suffix;
     return benchmark::RegisterBenchmark(full.c_str(), fn, format, args...);
 }
+
+// A frame as a caller hands it over: a plain malloc'ed buffer, without the
+// large-page hint the library gives its own frame-sized buffers, every page
+// written before timing, wrapped so that the library never frees it. With
+// `noise`, the same seeded bytes in every benchmark, alpha opaque as a
+// camera's; otherwise zeros.
+class CallerFrame {
+public:
+    CallerFrame(int32_t width, int32_t height, uint32_t format, bool noise)
+        : bytes_(QKImage_requiredSize(width, height, format)), data_(static_cast<uint8_t*>(malloc(bytes_))) {
+        memset(data_, 0, bytes_);
+        if (noise) {
+            std::mt19937 random(11);
+            for (uint64_t i = 0; i < bytes_; ++i) data_[i] = static_cast<uint8_t>(random());
+            const qk::FormatInfo* info = qk::find_format(format);
+            if (info != nullptr && info->family == qk::FormatFamily::kRgb && info->rgb.aOffset >= 0) {
+                for (uint64_t i = info->rgb.aOffset; i < bytes_; i += 4) data_[i] = 255;
+            }
+        }
+        image_ = QKImage_createWrap(data_, width, height, format, static_cast<int32_t>(bytes_), 0);
+    }
+    ~CallerFrame() {
+        QKImage_destroy(image_);
+        free(data_);
+    }
+    CallerFrame(const CallerFrame&) = delete;
+    CallerFrame& operator=(const CallerFrame&) = delete;
+
+    QKImage* image() const { return image_; }
+    uint8_t* data() const { return data_; }
+    uint64_t size() const { return bytes_; }
+
+private:
+    uint64_t bytes_;
+    uint8_t* data_;
+    QKImage* image_ = nullptr;
+};
 
 // Silences the library's messages for the scope.
 class QuietLog {

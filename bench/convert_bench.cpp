@@ -1,11 +1,8 @@
 // Pixel-format conversion through QKImage_convert, one benchmark per kernel
 // family at 1920x1080 and 4000x3000. Yardstick: BM_Memcpy in image_bench.cpp.
 #include <benchmark/benchmark.h>
-#include <string.h>
 
-#include <random>
 #include <string>
-#include <vector>
 
 #include "bench_util.h"
 #include "qkcore/qk_image.h"
@@ -14,27 +11,20 @@ namespace {
 
 using namespace qkbench;
 
-QKImage* random_image(int32_t width, int32_t height, uint32_t format) {
-    QKImage* image = QKImage_createNew(width, height, format);
-    std::mt19937 random(11);
-    for (uint64_t i = 0; i < image->size; ++i) image->data[i] = static_cast<uint8_t>(random());
-    return image;
-}
-
+// The caller's frames (CallerFrame), and rates per second of wall-clock
+// time: what a caller timing its own calls sees on the same machine.
 void BM_Convert(benchmark::State& state, uint32_t from, uint32_t to) {
     const int32_t width = static_cast<int32_t>(state.range(0));
     const int32_t height = static_cast<int32_t>(state.range(1));
     QuietLog quiet;  // the start line of every call is not what we measure
-    QKImage* src = random_image(width, height, from);
-    QKImage* dst = QKImage_createNew(width, height, to);
+    CallerFrame src(width, height, from, /*noise=*/true);
+    CallerFrame dst(width, height, to, /*noise=*/false);
     for (auto _ : state) {
-        if (QKImage_convert(src, dst) != QK_OK) state.SkipWithError("conversion failed");
-        benchmark::DoNotOptimize(dst->data);
+        if (QKImage_convert(src.image(), dst.image()) != QK_OK) state.SkipWithError("conversion failed");
+        benchmark::DoNotOptimize(dst.data());
         benchmark::ClobberMemory();
     }
-    set_rates(state, int64_t{width} * height, dst->size);
-    QKImage_destroy(src);
-    QKImage_destroy(dst);
+    set_rates(state, int64_t{width} * height, dst.size());
 }
 
 // Named after the formats: "BM_Convert/nv21_to_rgba", "BM_Convert/copy_nv21".
@@ -69,7 +59,7 @@ const struct {
     for (const auto& c : kConversions) {
         const std::string name = c.from == c.to ? "BM_Convert/copy_" + format_label(c.from)
                                                 : "BM_Convert/" + format_label(c.from) + "_to_" + format_label(c.to);
-        benchmark::RegisterBenchmark(name.c_str(), BM_Convert, c.from, c.to)->Apply(frame_sizes);
+        benchmark::RegisterBenchmark(name.c_str(), BM_Convert, c.from, c.to)->Apply(frame_sizes)->UseRealTime();
     }
     return true;
 }();
