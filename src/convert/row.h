@@ -1,8 +1,9 @@
 // Row kernels of the pixel-format conversions. Each conversion has a plain
-// reference kernel that reads the layouts at run time; faster variants with
-// the layouts fixed at compile time are chosen once per call through the
-// select_* functions, which fall back to the reference where no variant
-// exists. Every variant writes exactly the bytes of its reference kernel.
+// reference kernel that reads the layouts at run time; faster variants, with
+// the layouts fixed at compile time and, where the CPU has them, SIMD
+// instructions, are chosen once per call through the select_* functions,
+// which fall back to the reference where no variant exists. Every variant
+// writes exactly the bytes of its reference kernel.
 #ifndef QKCORE_SRC_CONVERT_ROW_H
 #define QKCORE_SRC_CONVERT_ROW_H
 
@@ -69,6 +70,47 @@ SampleRow select_sample_row(int src_step, int dst_step);
 ChromaRow select_chroma_row(int src_step, int dst_step);
 // Sets `count` U and V samples, `step` bytes apart, to `value`.
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value);
+
+// One set of row kernels: a selector per conversion, with the arguments of
+// the select_* function it serves. The portable set answers every request;
+// an instruction-set set answers null where it has no kernel, and the next
+// set is asked. Every kernel a set returns handles any width (tails included)
+// and touches no byte outside its rows.
+struct RowKernelSet {
+    const char* name;
+    RgbToRgbRow (*rgbToRgb)(int src_index, int dst_index);
+    RgbToLumaRow (*rgbToLuma)(int src_index, int luma_step);
+    RgbToChromaRow (*rgbToChroma)(int src_index, int chroma_step);
+    YuvToRgbRow (*yuvToRgb)(int dst_index, int luma_step, int chroma_step, int rows);
+    GreyToRgbRow (*greyToRgb)(int dst_index);
+    SampleRow (*sample)(int src_step, int dst_step);
+    ChromaRow (*chroma)(int src_step, int dst_step);
+};
+
+// The compiler-vectorised kernels (row_fast.cpp): baseline instructions only.
+extern const RowKernelSet kPortableRows;
+// The hand-written ones, each in a file of its own compiled for its
+// instruction set; the select_* functions consult those this CPU supports,
+// in this order, before the portable set.
+#if defined(__x86_64__)
+extern const RowKernelSet kAvx2Rows;   // x86/row_avx2.cpp
+extern const RowKernelSet kSsse3Rows;  // x86/row_ssse3.cpp
+#elif defined(__aarch64__)
+extern const RowKernelSet kNeonRows;  // arm/row_neon.cpp
+#endif
+
+// The instruction-set sets this CPU supports, best first (read once per
+// process), whether or not they are enabled. At most 4.
+struct SupportedRowSets {
+    const RowKernelSet* sets[4];
+    int count;
+};
+const SupportedRowSets& supported_row_sets();
+// On by default. Off, the select_* functions return portable kernels only:
+// for tests and benchmarks that compare the two. Not for concurrent use with
+// conversions in flight.
+void set_simd_enabled(bool enabled);
+bool simd_enabled();
 
 }  // namespace qk
 

@@ -273,25 +273,23 @@ constexpr auto kChromaRows = chroma_table(std::make_index_sequence<9>());
 bool valid_rgb_index(int index) { return index >= 0 && index < kRgbFormatCount; }
 bool valid_luma_step(int step) { return step == 1 || step == 2; }
 
-}  // namespace
-
-RgbToRgbRow select_rgb_to_rgb_row(int src_index, int dst_index) {
+RgbToRgbRow portable_rgb_to_rgb(int src_index, int dst_index) {
     if (!valid_rgb_index(src_index) || !valid_rgb_index(dst_index)) return rgb_to_rgb_row_reference;
     return kRgbToRgbRows[src_index * kRgbFormatCount + dst_index];
 }
 
-RgbToLumaRow select_rgb_to_luma_row(int src_index, int luma_step) {
+RgbToLumaRow portable_rgb_to_luma(int src_index, int luma_step) {
     if (!valid_rgb_index(src_index) || !valid_luma_step(luma_step)) return rgb_to_luma_row_reference;
     return kRgbToLumaRows[src_index * 2 + luma_step - 1];
 }
 
-RgbToChromaRow select_rgb_to_chroma_row(int src_index, int chroma_step) {
+RgbToChromaRow portable_rgb_to_chroma(int src_index, int chroma_step) {
     const int step = chroma_step_index(chroma_step);
     if (!valid_rgb_index(src_index) || step < 0) return rgb_to_chroma_row_reference;
     return kRgbToChromaRows[src_index * 3 + step];
 }
 
-YuvToRgbRow select_yuv_to_rgb_row(int dst_index, int luma_step, int chroma_step, int rows) {
+YuvToRgbRow portable_yuv_to_rgb(int dst_index, int luma_step, int chroma_step, int rows) {
     if (!valid_rgb_index(dst_index)) return yuv_to_rgb_row_reference;
     for (int i = 0; i < kYuvSourceShapeCount; ++i) {
         const YuvSourceShape& shape = kYuvSourceShapes[i];
@@ -302,20 +300,26 @@ YuvToRgbRow select_yuv_to_rgb_row(int dst_index, int luma_step, int chroma_step,
     return yuv_to_rgb_row_reference;
 }
 
-GreyToRgbRow select_grey_to_rgb_row(int dst_index) {
+GreyToRgbRow portable_grey_to_rgb(int dst_index) {
     return valid_rgb_index(dst_index) ? kGreyToRgbRows[dst_index] : grey_to_rgb_row_reference;
 }
 
-SampleRow select_sample_row(int src_step, int dst_step) {
+SampleRow portable_sample(int src_step, int dst_step) {
     if (!valid_luma_step(src_step) || !valid_luma_step(dst_step)) return sample_row_reference;
     return kSampleRows[(src_step - 1) * 2 + dst_step - 1];
 }
 
-ChromaRow select_chroma_row(int src_step, int dst_step) {
+ChromaRow portable_chroma(int src_step, int dst_step) {
     const int src = chroma_step_index(src_step);
     const int dst = chroma_step_index(dst_step);
     if (src < 0 || dst < 0) return chroma_row_reference;
     return kChromaRows[src * 3 + dst];
 }
+
+}  // namespace
+
+const RowKernelSet kPortableRows = {"portable",         portable_rgb_to_rgb, portable_rgb_to_luma,
+                                    portable_rgb_to_chroma, portable_yuv_to_rgb, portable_grey_to_rgb,
+                                    portable_sample,    portable_chroma};
 
 }  // namespace qk

@@ -1,7 +1,8 @@
-// The row kernels: every faster variant against its reference kernel for
-// every layout it is chosen for, each row at the very end of its memory, and
-// their colour arithmetic against the plain formulas over the whole input
-// domain (all 2^24 RGB colours and all 2^24 (Y, U, V)).
+// The row kernels: every kernel set this CPU supports (portable, and each
+// SIMD set) against the reference kernel for every layout it serves, each row
+// at the very end of its memory, and their colour arithmetic against the
+// plain formulas over the whole input domain (all 2^24 RGB colours and all
+// 2^24 (Y, U, V)).
 #include <gtest/gtest.h>
 #include <signal.h>
 #include <string.h>
@@ -67,9 +68,29 @@ private:
     std::vector<std::pair<uint8_t*, size_t>> outs_;
 };
 
-// A kernel under test: a run of its reference (true) or of the variant
-// chosen for it (false) over `width` pixels.
-using Run = std::function<void(bool reference, int width, Rows& rows)>;
+// Every kernel set this CPU can run, the portable one first.
+std::vector<const RowKernelSet*> every_set() {
+    std::vector<const RowKernelSet*> sets{&kPortableRows};
+    const SupportedRowSets& supported = supported_row_sets();
+    sets.insert(sets.end(), supported.sets, supported.sets + supported.count);
+    return sets;
+}
+
+// The kernel a set offers (null where it has none), or for no set the
+// reference.
+template <typename Row, typename... Args>
+Row pick(const RowKernelSet* set, Row reference, Row (*RowKernelSet::*selector)(Args...), Args... args) {
+    if (set == nullptr) return reference;
+    const auto select = set->*selector;
+    return select != nullptr ? select(args...) : nullptr;
+}
+#define QK_PICK(reference, selector, ...)                            \
+    auto kernel = pick(set, reference, &RowKernelSet::selector, __VA_ARGS__); \
+    if (kernel == nullptr) return false
+
+// A kernel under test: a run over `width` pixels of the reference (no set)
+// or of a set's kernel; false where the set has none.
+using Run = std::function<bool(const RowKernelSet* set, int width, Rows& rows)>;
 
 std::vector<std::pair<std::string, Run>> every_kernel() {
     std::vector<std::pair<std::string, Run>> all;
@@ -77,29 +98,31 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
         const RgbLayout rgb = kFormats[s].rgb;
         const size_t bpp = size_t(rgb.bytesPerPixel);
         const std::string from = kFormats[s].name;
-        all.emplace_back("GREY to " + from, [=](bool ref, int w, Rows& r) {
-            (ref ? grey_to_rgb_row_reference : select_grey_to_rgb_row(s))(r.in(w), r.out(w * bpp), w, rgb);
+        all.emplace_back("GREY to " + from, [=](const RowKernelSet* set, int w, Rows& r) {
+            QK_PICK(grey_to_rgb_row_reference, greyToRgb, s);
+            return kernel(r.in(w), r.out(w * bpp), w, rgb), true;
         });
         for (int d = 0; d < kRgbFormatCount; ++d) {
             const RgbToRgbShape shape{rgb, kFormats[d].rgb};
-            all.emplace_back(from + " to " + kFormats[d].name, [=](bool ref, int w, Rows& r) {
-                (ref ? rgb_to_rgb_row_reference : select_rgb_to_rgb_row(s, d))(
-                    r.in(w * bpp), r.out(size_t(w) * shape.dst.bytesPerPixel), w, shape);
+            all.emplace_back(from + " to " + kFormats[d].name, [=](const RowKernelSet* set, int w, Rows& r) {
+                QK_PICK(rgb_to_rgb_row_reference, rgbToRgb, s, d);
+                return kernel(r.in(w * bpp), r.out(size_t(w) * shape.dst.bytesPerPixel), w, shape), true;
             });
         }
         for (int step : {1, 2, 4}) {
             const RgbToYuvShape shape{rgb, step, step};
             const std::string name = from + " to step " + std::to_string(step);
             if (step != 4) {
-                all.emplace_back(name + " luma", [=](bool ref, int w, Rows& r) {
-                    (ref ? rgb_to_luma_row_reference : select_rgb_to_luma_row(s, step))(
-                        r.in(w * bpp), r.out(size_t(w) * step), w, shape);
+                all.emplace_back(name + " luma", [=](const RowKernelSet* set, int w, Rows& r) {
+                    QK_PICK(rgb_to_luma_row_reference, rgbToLuma, s, step);
+                    return kernel(r.in(w * bpp), r.out(size_t(w) * step), w, shape), true;
                 });
             }
-            all.emplace_back(name + " chroma", [=](bool ref, int w, Rows& r) {
+            all.emplace_back(name + " chroma", [=](const RowKernelSet* set, int w, Rows& r) {
+                QK_PICK(rgb_to_chroma_row_reference, rgbToChroma, s, step);
                 const uint8_t* in = r.in(w / 2 * 2 * bpp);
                 const auto [u, v] = r.chroma(true, step, w / 2);
-                (ref ? rgb_to_chroma_row_reference : select_rgb_to_chroma_row(s, step))(in, u, v, w / 2, shape);
+                return kernel(in, u, v, w / 2, shape), true;
             });
         }
         // Planar and semi-planar 4:2:0 (two luma rows over one chroma row)
@@ -108,7 +131,9 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
         for (int chromaStep : {1, 2, 4}) {
             const int lumaStep = chromaStep == 4 ? 2 : 1, rows = 3 - lumaStep;
             const YuvToRgbShape shape{lumaStep, chromaStep, rows, rgb};
-            all.emplace_back("YUV step " + std::to_string(chromaStep) + " to " + from, [=](bool ref, int w, Rows& r) {
+            all.emplace_back("YUV step " + std::to_string(chromaStep) + " to " + from, [=](const RowKernelSet* set,
+                                                                                          int w, Rows& r) {
+                QK_PICK(yuv_to_rgb_row_reference, yuvToRgb, s, lumaStep, chromaStep, rows);
                 const int even = w / 2 * 2;
                 uint8_t* y0 = r.in(size_t(even) * lumaStep);
                 uint8_t* y1 = rows == 2 ? r.in(even) : nullptr;
@@ -116,8 +141,7 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
                 if (even >= 4) u[chromaStep] = 28, v[chromaStep] = 228;
                 uint8_t* d0 = r.out(even * bpp);
                 uint8_t* d1 = rows == 2 ? r.out(even * bpp) : nullptr;
-                (ref ? yuv_to_rgb_row_reference : select_yuv_to_rgb_row(s, lumaStep, chromaStep, rows))(
-                    y0, y1, u, v, d0, d1, even, shape);
+                return kernel(y0, y1, u, v, d0, d1, even, shape), true;
             });
         }
     }
@@ -125,16 +149,17 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
         for (int to : {1, 2, 4}) {
             const std::string name = std::to_string(from) + " to " + std::to_string(to);
             if (from != 4 && to != 4) {
-                all.emplace_back("samples " + name, [=](bool ref, int w, Rows& r) {
-                    (ref ? sample_row_reference : select_sample_row(from, to))(
-                        r.in(size_t(w) * from), from, r.out(size_t(w) * to), to, w);
+                all.emplace_back("samples " + name, [=](const RowKernelSet* set, int w, Rows& r) {
+                    QK_PICK(sample_row_reference, sample, from, to);
+                    return kernel(r.in(size_t(w) * from), from, r.out(size_t(w) * to), to, w), true;
                 });
             }
             // V before U on the source side, U before V on the other.
-            all.emplace_back("chroma " + name, [=](bool ref, int w, Rows& r) {
+            all.emplace_back("chroma " + name, [=](const RowKernelSet* set, int w, Rows& r) {
+                QK_PICK(chroma_row_reference, chroma, from, to);
                 const auto [v, u] = r.chroma(false, from, w);
                 const auto [du, dv] = r.chroma(true, to, w);
-                (ref ? chroma_row_reference : select_chroma_row(from, to))(u, v, from, du, dv, to, w);
+                return kernel(u, v, from, du, dv, to, w), true;
             });
         }
     }
@@ -151,72 +176,100 @@ extern "C" void report_fault(int) {
 // Every width up to 67: tails of every length.
 TEST(RowVariants, EveryVariantWritesExactlyTheBytesOfItsReferenceWithinItsRows) {
     signal(SIGSEGV, report_fault);
-    for (const auto& [name, run] : every_kernel()) {
-        for (int width = 0; width <= 67; ++width) {
-            running = name + ", width " + std::to_string(width) + ": a row was overrun\n";
-            Rows reference{unsigned(width)}, variant{unsigned(width)};
-            run(true, width, reference);
-            run(false, width, variant);
-            EXPECT_EQ(variant.written(), reference.written()) << name << ", width " << width;
+    for (const RowKernelSet* set : every_set()) {
+        for (const auto& [kernel, run] : every_kernel()) {
+            const std::string name = std::string(set->name) + " " + kernel;
+            for (int width = 0; width <= 67; ++width) {
+                running = name + ", width " + std::to_string(width) + ": a row was overrun\n";
+                Rows reference{unsigned(width)}, variant{unsigned(width)};
+                if (!run(set, width, variant)) break;
+                run(nullptr, width, reference);
+                EXPECT_EQ(variant.written(), reference.written()) << name << ", width " << width;
+            }
         }
     }
     signal(SIGSEGV, SIG_DFL);
 }
 
+// For every kernel set, on a 3-byte and a 4-byte layout.
 TEST(Exhaustive, RgbToYuvGivesTheFormulaForEveryColour) {
     // One row per red value holding every (green, blue) at an even pixel, the
     // pixel whose colour the chroma is taken from; the odd pixels hold other
     // colours, (255 - r, b, g), so a kernel reading the wrong pixel of a pair shows.
-    const int index = rgb_format_index(QK_FORMAT_BGR8);
-    const RgbToYuvShape shape{kFormats[index].rgb, 1, 1};
-    const RgbToLumaRow lumaRow = select_rgb_to_luma_row(index, 1);
-    const RgbToChromaRow chromaRow = select_rgb_to_chroma_row(index, 1);
     constexpr int kPairs = 65536;
-    std::vector<uint8_t> bgr(2 * kPairs * 3), luma(2 * kPairs), u(kPairs), v(kPairs);
-    long mismatches = 0;
-    for (int r = 0; r < 256; ++r) {
-        for (int k = 0; k < kPairs; ++k) {
-            const uint8_t b = uint8_t(k), g = uint8_t(k >> 8), pair[6] = {b, g, uint8_t(r), g, b, uint8_t(255 - r)};
-            std::copy_n(pair, 6, &bgr[6 * k]);
-        }
-        lumaRow(bgr.data(), luma.data(), 2 * kPairs, shape);
-        chromaRow(bgr.data(), u.data(), v.data(), kPairs, shape);
-        for (int k = 0; k < kPairs; ++k) {
-            const int g = k >> 8, b = k & 255;
-            const qktest::Yuv want = formula_rgb_to_yuv(r, g, b), odd = formula_rgb_to_yuv(255 - r, b, g);
-            if (luma[2 * k] != want.y || u[k] != want.u || v[k] != want.v || luma[2 * k + 1] != odd.y) {
-                if (++mismatches <= 5) ADD_FAILURE() << "R,G,B " << r << "," << g << "," << b;
+    for (const RowKernelSet* set : every_set()) {
+        for (uint32_t format : {QK_FORMAT_BGR8, QK_FORMAT_ARGB}) {
+            const int index = rgb_format_index(format);
+            const RgbLayout layout = kFormats[index].rgb;
+            const RgbToYuvShape shape{layout, 1, 1};
+            const RgbToLumaRow lumaRow = set->rgbToLuma ? set->rgbToLuma(index, 1) : nullptr;
+            const RgbToChromaRow chromaRow = set->rgbToChroma ? set->rgbToChroma(index, 1) : nullptr;
+            if (lumaRow == nullptr || chromaRow == nullptr) continue;
+            const int bpp = layout.bytesPerPixel;
+            std::vector<uint8_t> rgb(2 * kPairs * bpp, 7), luma(2 * kPairs), u(kPairs), v(kPairs);
+            long mismatches = 0;
+            for (int r = 0; r < 256; ++r) {
+                for (int k = 0; k < kPairs; ++k) {
+                    const uint8_t b = uint8_t(k), g = uint8_t(k >> 8);
+                    uint8_t* pair = &rgb[2 * k * bpp];
+                    pair[layout.rOffset] = uint8_t(r), pair[layout.gOffset] = g, pair[layout.bOffset] = b;
+                    pair += bpp;
+                    pair[layout.rOffset] = uint8_t(255 - r), pair[layout.gOffset] = b, pair[layout.bOffset] = g;
+                }
+                lumaRow(rgb.data(), luma.data(), 2 * kPairs, shape);
+                chromaRow(rgb.data(), u.data(), v.data(), kPairs, shape);
+                for (int k = 0; k < kPairs; ++k) {
+                    const int g = k >> 8, b = k & 255;
+                    const qktest::Yuv want = formula_rgb_to_yuv(r, g, b), odd = formula_rgb_to_yuv(255 - r, b, g);
+                    if (luma[2 * k] != want.y || u[k] != want.u || v[k] != want.v || luma[2 * k + 1] != odd.y) {
+                        if (++mismatches <= 5) {
+                            ADD_FAILURE() << set->name << " " << kFormats[index].name << " R,G,B " << r << "," << g
+                                          << "," << b;
+                        }
+                    }
+                }
             }
+            EXPECT_EQ(mismatches, 0) << set->name << " " << kFormats[index].name;
         }
     }
-    EXPECT_EQ(mismatches, 0);
 }
 
 TEST(Exhaustive, YuvToRgbMatchesDoublePrecisionForEveryTriple) {
     // For each chroma pair, two rows of 128 lumas (0..127 and 128..255) that
     // share 64 copies of that pair, as a 4:2:0 row pair does.
-    const int index = rgb_format_index(QK_FORMAT_RGBA);
-    const YuvToRgbShape shape{1, 2, 2, kFormats[index].rgb};
-    const YuvToRgbRow row = select_yuv_to_rgb_row(index, 1, 2, 2);
     constexpr int kWidth = 128;
-    std::vector<uint8_t> luma(2 * kWidth), chroma(kWidth), rgba(2 * kWidth * 4);
-    for (int i = 0; i < 2 * kWidth; ++i) luma[i] = static_cast<uint8_t>(i);
-    long mismatches = 0;
-    for (int u = 0; u < 256; ++u) {
-        for (int v = 0; v < 256; ++v) {
-            for (int j = 0; j < kWidth; ++j) chroma[j] = static_cast<uint8_t>(j % 2 == 0 ? u : v);
-            row(luma.data(), luma.data() + kWidth, chroma.data(), chroma.data() + 1, rgba.data(),
-                rgba.data() + kWidth * 4, kWidth, shape);
-            for (int y = 0; y < 256; ++y) {
-                const qktest::Rgb want = formula_yuv_to_rgb(y, u, v);
-                const uint8_t* got = &rgba[4 * y];
-                if (got[0] != want.r || got[1] != want.g || got[2] != want.b || got[3] != 255) {
-                    if (++mismatches <= 5) ADD_FAILURE() << "Y,U,V " << y << "," << u << "," << v;
+    for (const RowKernelSet* set : every_set()) {
+        for (uint32_t format : {QK_FORMAT_RGB8, QK_FORMAT_BGRA}) {
+            const int index = rgb_format_index(format);
+            const RgbLayout layout = kFormats[index].rgb;
+            const YuvToRgbShape shape{1, 2, 2, layout};
+            const YuvToRgbRow row = set->yuvToRgb ? set->yuvToRgb(index, 1, 2, 2) : nullptr;
+            if (row == nullptr) continue;
+            const int bpp = layout.bytesPerPixel;
+            std::vector<uint8_t> luma(2 * kWidth), chroma(kWidth), out(2 * kWidth * bpp);
+            for (int i = 0; i < 2 * kWidth; ++i) luma[i] = static_cast<uint8_t>(i);
+            long mismatches = 0;
+            for (int u = 0; u < 256; ++u) {
+                for (int v = 0; v < 256; ++v) {
+                    for (int j = 0; j < kWidth; ++j) chroma[j] = static_cast<uint8_t>(j % 2 == 0 ? u : v);
+                    row(luma.data(), luma.data() + kWidth, chroma.data(), chroma.data() + 1, out.data(),
+                        out.data() + kWidth * bpp, kWidth, shape);
+                    for (int y = 0; y < 256; ++y) {
+                        const qktest::Rgb want = formula_yuv_to_rgb(y, u, v);
+                        const uint8_t* got = &out[bpp * y];
+                        if (got[layout.rOffset] != want.r || got[layout.gOffset] != want.g ||
+                            got[layout.bOffset] != want.b || (bpp == 4 && got[layout.aOffset] != 255)) {
+                            if (++mismatches <= 5) {
+                                ADD_FAILURE() << set->name << " " << kFormats[index].name << " Y,U,V " << y << ","
+                                              << u << "," << v;
+                            }
+                        }
+                    }
                 }
             }
+            EXPECT_EQ(mismatches, 0) << set->name << " " << kFormats[index].name;
         }
     }
-    EXPECT_EQ(mismatches, 0);
 }
 
 }  // namespace

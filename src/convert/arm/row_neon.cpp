@@ -1,0 +1,517 @@
+// Row kernels for AArch64 with NEON, which every AArch64 CPU has. Compiled
+// only for aarch64 targets. Each kernel converts whole blocks of 16 pixels
+// (or samples) with vector loads and stores and leaves the rest of the row to
+// its reference kernel; a block is taken only where every byte it reads or
+// writes lies within the bytes the reference kernel would read or write for
+// the row. Stores into every other byte (luma of packed 4:2:2, chroma among
+// luma) load the block first and write back the bytes between unchanged.
+// A null selector answer leaves the request to the portable set.
+#include <arm_neon.h>
+#include <stddef.h>
+#include <stdint.h>
+#include <string.h>
+
+#include <array>
+#include <utility>
+
+#include "convert/pixel.h"
+#include "convert/row.h"
+
+namespace qk {
+namespace {
+
+constexpr int kBlock = 16;
+
+template <int F>
+constexpr RgbLayout layout() {
+    return kFormats[F].rgb;
+}
+
+// 16 pixels as one vector per channel; alpha 255 where the layout has none.
+struct Pixels {
+    uint8x16_t r, g, b, a;
+};
+
+template <int F>
+inline Pixels load_pixels(const uint8_t* p) {
+    constexpr RgbLayout l = layout<F>();
+    if constexpr (l.bytesPerPixel == 3) {
+        const uint8x16x3_t in = vld3q_u8(p);
+        return {in.val[l.rOffset], in.val[l.gOffset], in.val[l.bOffset], vdupq_n_u8(255)};
+    } else {
+        const uint8x16x4_t in = vld4q_u8(p);
+        return {in.val[l.rOffset], in.val[l.gOffset], in.val[l.bOffset], in.val[l.aOffset]};
+    }
+}
+
+template <int F>
+inline void store_pixels(uint8_t* p, const Pixels& px) {
+    constexpr RgbLayout l = layout<F>();
+    if constexpr (l.bytesPerPixel == 3) {
+        uint8x16x3_t out;
+        out.val[l.rOffset] = px.r;
+        out.val[l.gOffset] = px.g;
+        out.val[l.bOffset] = px.b;
+        vst3q_u8(p, out);
+    } else {
+        uint8x16x4_t out;
+        out.val[l.rOffset] = px.r;
+        out.val[l.gOffset] = px.g;
+        out.val[l.bOffset] = px.b;
+        out.val[l.aOffset] = px.a;
+        vst4q_u8(p, out);
+    }
+}
+
+// Every other byte of 32, from p: loaded, or stored with the bytes between
+// written back as they were.
+inline uint8x16_t load_even(const uint8_t* p) { return vld2q_u8(p).val[0]; }
+inline void store_even(uint8_t* p, uint8x16_t values) {
+    uint8x16x2_t block = vld2q_u8(p);
+    block.val[0] = values;
+    vst2q_u8(p, block);
+}
+
+// U and V rows of `step`: two planes (1), one row of pairs (2), or bytes 1
+// and 3 of the pixel pairs of packed 4:2:2 (4), in either order. Steps 2 and
+// 4 are read and written together from the lower of the two addresses; rows
+// where U and V are not neighbours in that way go to the reference kernel.
+template <int Step>
+inline bool chroma_together(const uint8_t* u, const uint8_t* v) {
+    if constexpr (Step == 1) {
+        return true;
+    } else {
+        return u + Step / 2 == v || v + Step / 2 == u;
+    }
+}
+
+// Samples a step-4 block reads or writes past its last V (the luma byte
+// after it), and a step-2 luma block past its last sample: such blocks need
+// one more sample of the row after them.
+template <int Step>
+constexpr int overreach() {
+    return Step == 4 ? 1 : 0;
+}
+
+struct Chroma {
+    uint8x16_t u, v;
+};
+
+template <int Step>
+inline Chroma load_chroma(const uint8_t* u, const uint8_t* v) {
+    if constexpr (Step == 1) {
+        return {vld1q_u8(u), vld1q_u8(v)};
+    } else if constexpr (Step == 2) {
+        const uint8x16x2_t in = vld2q_u8(u < v ? u : v);
+        return u < v ? Chroma{in.val[0], in.val[1]} : Chroma{in.val[1], in.val[0]};
+    } else {
+        const uint8x16x4_t in = vld4q_u8(u < v ? u : v);
+        return u < v ? Chroma{in.val[0], in.val[2]} : Chroma{in.val[2], in.val[0]};
+    }
+}
+
+template <int Step>
+inline void store_chroma(uint8_t* u, uint8_t* v, const Chroma& c) {
+    if constexpr (Step == 1) {
+        vst1q_u8(u, c.u);
+        vst1q_u8(v, c.v);
+    } else if constexpr (Step == 2) {
+        uint8x16x2_t out;
+        out.val[u < v ? 0 : 1] = c.u;
+        out.val[u < v ? 1 : 0] = c.v;
+        vst2q_u8(u < v ? u : v, out);
+    } else {
+        uint8_t* first = u < v ? u : v;
+        uint8x16x4_t block = vld4q_u8(first);
+        block.val[u < v ? 0 : 2] = c.u;
+        block.val[u < v ? 2 : 0] = c.v;
+        vst4q_u8(first, block);
+    }
+}
+
+// RGB to RGB -----------------------------------------------------------------
+
+template <int S, int D>
+void rgb_to_rgb(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape& shape) {
+    constexpr ptrdiff_t in = layout<S>().bytesPerPixel, out = layout<D>().bytesPerPixel;
+    ptrdiff_t x = 0;
+    for (; x + kBlock <= width; x += kBlock) store_pixels<D>(dst + x * out, load_pixels<S>(src + x * in));
+    rgb_to_rgb_row_reference(src + x * in, dst + x * out, static_cast<int>(width - x), shape);
+}
+
+// Same layout on both sides: the reference copies every byte.
+template <int F>
+void copy_rgb(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape&) {
+    if (width > 0) memcpy(dst, src, static_cast<size_t>(width) * layout<F>().bytesPerPixel);
+}
+
+template <int S, int D>
+constexpr RgbToRgbRow rgb_to_rgb_variant() {
+    if constexpr (S == D) {
+        return copy_rgb<S>;
+    } else {
+        return rgb_to_rgb<S, D>;
+    }
+}
+
+template <size_t... I>
+constexpr std::array<RgbToRgbRow, sizeof...(I)> rgb_to_rgb_table(std::index_sequence<I...>) {
+    return {rgb_to_rgb_variant<I / kRgbFormatCount, I % kRgbFormatCount>()...};
+}
+constexpr auto kRgbToRgbRows = rgb_to_rgb_table(std::make_index_sequence<kRgbFormatCount * kRgbFormatCount>());
+
+template <int D>
+void grey_to_rgb(const uint8_t* luma, uint8_t* dst, int width, const RgbLayout& layout_arg) {
+    constexpr ptrdiff_t out = layout<D>().bytesPerPixel;
+    ptrdiff_t x = 0;
+    for (; x + kBlock <= width; x += kBlock) {
+        const uint8x16_t y = vld1q_u8(luma + x);
+        store_pixels<D>(dst + x * out, Pixels{y, y, y, vdupq_n_u8(255)});
+    }
+    grey_to_rgb_row_reference(luma + x, dst + x * out, static_cast<int>(width - x), layout_arg);
+}
+
+template <size_t... I>
+constexpr std::array<GreyToRgbRow, sizeof...(I)> grey_to_rgb_table(std::index_sequence<I...>) {
+    return {grey_to_rgb<I>...};
+}
+constexpr auto kGreyToRgbRows = grey_to_rgb_table(std::make_index_sequence<kRgbFormatCount>());
+
+// RGB to YUV -----------------------------------------------------------------
+
+// rgb_luma of 16 pixels: the weighted sum needs 32 bits.
+inline uint16x4_t luma_part(uint16x4_t r, uint16x4_t g, uint16x4_t b) {
+    uint32x4_t sum = vmull_n_u16(r, 19595);
+    sum = vmlal_n_u16(sum, g, 38470);
+    sum = vmlal_n_u16(sum, b, 7471);
+    return vshrn_n_u32(sum, 16);
+}
+inline uint16x8_t luma_half(uint8x8_t r, uint8x8_t g, uint8x8_t b) {
+    const uint16x8_t r16 = vmovl_u8(r), g16 = vmovl_u8(g), b16 = vmovl_u8(b);
+    return vcombine_u16(luma_part(vget_low_u16(r16), vget_low_u16(g16), vget_low_u16(b16)),
+                        luma_part(vget_high_u16(r16), vget_high_u16(g16), vget_high_u16(b16)));
+}
+inline uint8x16_t luma16(const Pixels& px) {
+    return vcombine_u8(vmovn_u16(luma_half(vget_low_u8(px.r), vget_low_u8(px.g), vget_low_u8(px.b))),
+                       vmovn_u16(luma_half(vget_high_u8(px.r), vget_high_u8(px.g), vget_high_u8(px.b))));
+}
+
+// rgb_chroma_u/v of 16 pixels. The weight w (36962 or 46727) does not fit a
+// signed 16-bit lane, so d * w >> 16 is taken as (d * (w - 65536) >> 16) + d:
+// the same floor, as d * 65536 divides exactly.
+template <int16_t WeightLess65536>
+inline int16x8_t chroma_half(int16x8_t d) {
+    const int16x8_t scaled = vcombine_s16(vshrn_n_s32(vmull_n_s16(vget_low_s16(d), WeightLess65536), 16),
+                                          vshrn_n_s32(vmull_high_n_s16(d, WeightLess65536), 16));
+    return vaddq_s16(vaddq_s16(scaled, d), vdupq_n_s16(128));
+}
+template <int16_t WeightLess65536>
+inline uint8x16_t chroma16(uint8x16_t channel, uint8x16_t luma) {
+    const int16x8_t low = vreinterpretq_s16_u16(vsubl_u8(vget_low_u8(channel), vget_low_u8(luma)));
+    const int16x8_t high = vreinterpretq_s16_u16(vsubl_high_u8(channel, luma));
+    return vqmovun_high_s16(vqmovun_s16(chroma_half<WeightLess65536>(low)), chroma_half<WeightLess65536>(high));
+}
+constexpr int16_t kUWeight = 36962 - 65536;
+constexpr int16_t kVWeight = 46727 - 65536;
+
+template <int S, int Step>
+void rgb_to_luma(const uint8_t* rgb, uint8_t* luma, int width, const RgbToYuvShape& shape) {
+    constexpr ptrdiff_t in = layout<S>().bytesPerPixel;
+    // A step-2 block writes back the byte after its last sample.
+    constexpr int reach = Step == 2 ? 1 : 0;
+    ptrdiff_t x = 0;
+    for (; x + kBlock + reach <= width; x += kBlock) {
+        const uint8x16_t y = luma16(load_pixels<S>(rgb + x * in));
+        if constexpr (Step == 1) {
+            vst1q_u8(luma + x, y);
+        } else {
+            store_even(luma + 2 * x, y);
+        }
+    }
+    rgb_to_luma_row_reference(rgb + x * in, luma + x * Step, static_cast<int>(width - x), shape);
+}
+
+template <size_t... I>
+constexpr std::array<RgbToLumaRow, sizeof...(I)> rgb_to_luma_table(std::index_sequence<I...>) {
+    return {rgb_to_luma<I / 2, I % 2 + 1>...};  // luma steps 1, 2
+}
+constexpr auto kRgbToLumaRows = rgb_to_luma_table(std::make_index_sequence<kRgbFormatCount * 2>());
+
+// 16 pairs a block: the left pixels of 32.
+template <int S, int Step>
+void rgb_to_chroma(const uint8_t* rgb, uint8_t* u, uint8_t* v, int pairs, const RgbToYuvShape& shape) {
+    constexpr ptrdiff_t in = layout<S>().bytesPerPixel;
+    ptrdiff_t j = 0;
+    if (chroma_together<Step>(u, v)) {
+        for (; j + kBlock + overreach<Step>() <= pairs; j += kBlock) {
+            const Pixels first = load_pixels<S>(rgb + 2 * j * in);
+            const Pixels second = load_pixels<S>(rgb + (2 * j + kBlock) * in);
+            const Pixels left{vuzp1q_u8(first.r, second.r), vuzp1q_u8(first.g, second.g),
+                              vuzp1q_u8(first.b, second.b), {}};
+            const uint8x16_t y = luma16(left);
+            store_chroma<Step>(u + j * Step, v + j * Step,
+                               Chroma{chroma16<kUWeight>(left.b, y), chroma16<kVWeight>(left.r, y)});
+        }
+    }
+    rgb_to_chroma_row_reference(rgb + 2 * j * in, u + j * Step, v + j * Step, static_cast<int>(pairs - j), shape);
+}
+
+constexpr int kChromaSteps[] = {1, 2, 4};
+template <size_t... I>
+constexpr std::array<RgbToChromaRow, sizeof...(I)> rgb_to_chroma_table(std::index_sequence<I...>) {
+    return {rgb_to_chroma<I / 3, kChromaSteps[I % 3]>...};
+}
+constexpr auto kRgbToChromaRows = rgb_to_chroma_table(std::make_index_sequence<kRgbFormatCount * 3>());
+
+int chroma_step_index(int step) {
+    for (int i = 0; i < 3; ++i) {
+        if (kChromaSteps[i] == step) return i;
+    }
+    return -1;
+}
+
+// YUV to RGB -----------------------------------------------------------------
+
+// The integer form of row_fast.cpp: per chroma pair the offsets floor(1.402 v),
+// floor(-(0.34414 u + 0.71414 v)) and floor(1.772 u) (u = U - 128,
+// v = V - 128), each pixel clamp(Y + offset); the pair U = 28, V = 228 takes
+// the double path. Red and blue in 16-bit lanes: floor(1.402 v) is
+// v + (v * 26346 >> 16) and floor(1.772 u) is 2u + (u * -14942 >> 16) for
+// every u, v in [-128, 127] (checked below), one doubling multiply-high each.
+// Green exactly as row_fast.cpp's green_offset: the exact numerator
+// -34414 u - 71414 v, shifted by 200 * 100000 to be non-negative, divided by
+// 32 and then by 3125 through a multiply-high with ceil(2^31 / 3125) = 687195,
+// which is exact below 2^31 / 727 (the rounding excess of 687195 * 3125),
+// and the shifted values stay below 2^20.
+constexpr int16_t kRedHalf = 13173;   // 26346 / 2
+constexpr int16_t kBlueHalf = -7471;  // -14942 / 2
+constexpr int32_t kGreenBias = 200 * 100000;
+constexpr int32_t kDiv3125 = 687195;
+
+constexpr int64_t floor_div(int64_t numerator, int64_t denominator) {
+    const int64_t quotient = numerator / denominator;
+    return quotient * denominator > numerator ? quotient - 1 : quotient;
+}
+// The lanes' arithmetic: a doubling multiply-high keeps bits 16.. (32..) of
+// twice the product; `>>` of a negative value is arithmetic with GCC and Clang.
+constexpr int64_t doubling_high(int64_t a, int64_t b, int bits) { return (2 * a * b) >> bits; }
+constexpr bool integer_offsets_exact() {
+    for (int u = -128; u < 128; ++u) {
+        if (u + doubling_high(u, kRedHalf, 16) != floor_div(1402 * u, 1000)) return false;
+        if (2 * u + doubling_high(u, kBlueHalf, 16) != floor_div(1772 * u, 1000)) return false;
+        for (int v = -128; v < 128; ++v) {
+            const int32_t numerator = -34414 * u - 71414 * v;
+            const int64_t green = doubling_high((numerator + kGreenBias) >> 5, kDiv3125, 32) - 200;
+            if (green != floor_div(numerator, 100000)) return false;
+        }
+    }
+    return true;
+}
+static_assert(integer_offsets_exact(), "the lane arithmetic must give the integer offsets for every chroma pair");
+
+struct Offsets {
+    int16x8_t r, g, b;  // one lane per chroma pair
+};
+
+inline int16x4_t green_part(int16x4_t u, int16x4_t v) {
+    const int32x4_t numerator = vmlaq_n_s32(vmulq_n_s32(vmovl_s16(u), -34414), vmovl_s16(v), -71414);
+    const int32x4_t shifted = vshrq_n_s32(vaddq_s32(numerator, vdupq_n_s32(kGreenBias)), 5);
+    return vmovn_s32(vqdmulhq_n_s32(shifted, kDiv3125));
+}
+
+inline Offsets chroma_offsets(uint8x8_t u_bytes, uint8x8_t v_bytes) {
+    const int16x8_t u = vreinterpretq_s16_u16(vsubl_u8(u_bytes, vdup_n_u8(128)));
+    const int16x8_t v = vreinterpretq_s16_u16(vsubl_u8(v_bytes, vdup_n_u8(128)));
+    const int16x8_t green = vcombine_s16(green_part(vget_low_s16(u), vget_low_s16(v)),
+                                         green_part(vget_high_s16(u), vget_high_s16(v)));
+    return {vaddq_s16(v, vqdmulhq_n_s16(v, kRedHalf)), vsubq_s16(green, vdupq_n_s16(200)),
+            vaddq_s16(vaddq_s16(u, u), vqdmulhq_n_s16(u, kBlueHalf))};
+}
+
+// clamp(Y + offset) of 16 pixels, pixel 2k and 2k + 1 taking lane k.
+inline uint8x16_t channel(uint8x16_t luma, int16x8_t offset) {
+    const int16x8_t low = vaddq_s16(vreinterpretq_s16_u16(vmovl_u8(vget_low_u8(luma))), vzip1q_s16(offset, offset));
+    const int16x8_t high = vaddq_s16(vreinterpretq_s16_u16(vmovl_high_u8(luma)), vzip2q_s16(offset, offset));
+    return vqmovun_high_s16(vqmovun_s16(low), high);
+}
+
+template <int D>
+inline void store_yuv_pixels(uint8_t* dst, uint8x16_t luma, const Offsets& offsets) {
+    store_pixels<D>(dst, Pixels{channel(luma, offsets.r), channel(luma, offsets.g), channel(luma, offsets.b),
+                                vdupq_n_u8(255)});
+}
+
+inline bool any_double_path_pair(uint8x8_t u, uint8x8_t v) {
+    return vmaxv_u8(vand_u8(vceq_u8(u, vdup_n_u8(28)), vceq_u8(v, vdup_n_u8(228)))) != 0;
+}
+
+// 16 pixels (8 chroma pairs) a block. Packed 4:2:2 (luma step 2) reads its
+// chroma from the luma row, so U and V must be its bytes 1 and 3.
+template <int D, int LumaStep, int ChromaStep, int Rows>
+void yuv_to_rgb(const uint8_t* y0, const uint8_t* y1, const uint8_t* u, const uint8_t* v, uint8_t* d0,
+                uint8_t* d1, int width, const YuvToRgbShape& shape) {
+    constexpr ptrdiff_t out = layout<D>().bytesPerPixel;
+    constexpr int kPairs = kBlock / 2;
+    bool vectors = chroma_together<ChromaStep>(u, v);
+    if constexpr (LumaStep == 2) vectors = vectors && (u < v ? u : v) == y0 + 1;
+    ptrdiff_t x = 0;
+    for (; vectors && x + kBlock <= width; x += kBlock) {
+        const ptrdiff_t j = x / 2;
+        uint8x8_t u_bytes, v_bytes;
+        uint8x16_t luma0;
+        if constexpr (LumaStep == 2) {
+            const uint8x8x4_t in = vld4_u8(y0 + 2 * x);
+            const uint8x8x2_t luma = vzip_u8(in.val[0], in.val[2]);
+            luma0 = vcombine_u8(luma.val[0], luma.val[1]);
+            u_bytes = u < v ? in.val[1] : in.val[3];
+            v_bytes = u < v ? in.val[3] : in.val[1];
+        } else if constexpr (ChromaStep == 2) {
+            const uint8x8x2_t in = vld2_u8((u < v ? u : v) + 2 * j);
+            u_bytes = u < v ? in.val[0] : in.val[1];
+            v_bytes = u < v ? in.val[1] : in.val[0];
+            luma0 = vld1q_u8(y0 + x);
+        } else {
+            u_bytes = vld1_u8(u + j);
+            v_bytes = vld1_u8(v + j);
+            luma0 = vld1q_u8(y0 + x);
+        }
+        const Offsets offsets = chroma_offsets(u_bytes, v_bytes);
+        store_yuv_pixels<D>(d0 + x * out, luma0, offsets);
+        if constexpr (Rows == 2) store_yuv_pixels<D>(d1 + x * out, vld1q_u8(y1 + x), offsets);
+        if (any_double_path_pair(u_bytes, v_bytes)) {
+            for (ptrdiff_t k = j; k < j + kPairs; ++k) {
+                if (u[k * ChromaStep] != 28 || v[k * ChromaStep] != 228) continue;
+                yuv_to_rgb_row_reference(y0 + 2 * k * LumaStep, Rows == 2 ? y1 + 2 * k : nullptr, u + k * ChromaStep,
+                                         v + k * ChromaStep, d0 + 2 * k * out, Rows == 2 ? d1 + 2 * k * out : nullptr,
+                                         2, shape);
+            }
+        }
+    }
+    yuv_to_rgb_row_reference(y0 + x * LumaStep, Rows == 2 ? y1 + x : nullptr, u + x / 2 * ChromaStep,
+                             v + x / 2 * ChromaStep, d0 + x * out, Rows == 2 ? d1 + x * out : nullptr,
+                             static_cast<int>(width - x), shape);
+}
+
+// The source shapes served: planar and semi-planar 4:2:0, packed 4:2:2.
+struct YuvSourceShape {
+    int lumaStep, chromaStep, rows;
+};
+constexpr YuvSourceShape kYuvSourceShapes[] = {{1, 1, 2}, {1, 2, 2}, {2, 4, 1}};
+constexpr int kYuvSourceShapeCount = 3;
+
+template <size_t... I>
+constexpr std::array<YuvToRgbRow, sizeof...(I)> yuv_to_rgb_table(std::index_sequence<I...>) {
+    return {yuv_to_rgb<I / kYuvSourceShapeCount, kYuvSourceShapes[I % kYuvSourceShapeCount].lumaStep,
+                       kYuvSourceShapes[I % kYuvSourceShapeCount].chromaStep,
+                       kYuvSourceShapes[I % kYuvSourceShapeCount].rows>...};
+}
+constexpr auto kYuvToRgbRows = yuv_to_rgb_table(std::make_index_sequence<kRgbFormatCount * kYuvSourceShapeCount>());
+
+// YUV to YUV -----------------------------------------------------------------
+
+template <int From, int To>
+void sample_row(const uint8_t* src, int src_step, uint8_t* dst, int dst_step, int count) {
+    if constexpr (From == 1 && To == 1) {
+        if (count > 0) memcpy(dst, src, static_cast<size_t>(count));
+    } else {
+        // A step-2 block reads or writes the byte after its last sample.
+        constexpr int reach = 1;
+        ptrdiff_t i = 0;
+        for (; i + kBlock + reach <= count; i += kBlock) {
+            const uint8x16_t samples = From == 1 ? vld1q_u8(src + i) : load_even(src + 2 * i);
+            if constexpr (To == 1) {
+                vst1q_u8(dst + i, samples);
+            } else {
+                store_even(dst + 2 * i, samples);
+            }
+        }
+        sample_row_reference(src + i * From, src_step, dst + i * To, dst_step, static_cast<int>(count - i));
+    }
+}
+
+template <size_t... I>
+constexpr std::array<SampleRow, sizeof...(I)> sample_table(std::index_sequence<I...>) {
+    return {sample_row<I / 2 + 1, I % 2 + 1>...};  // luma steps 1, 2
+}
+constexpr auto kSampleRows = sample_table(std::make_index_sequence<4>());
+
+template <int From, int To>
+void chroma_row(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_t* dst_u, uint8_t* dst_v,
+                int dst_step, int count) {
+    ptrdiff_t i = 0;
+    if constexpr (From == 1 && To == 1) {
+        if (count > 0) {
+            memcpy(dst_u, src_u, static_cast<size_t>(count));
+            memcpy(dst_v, src_v, static_cast<size_t>(count));
+        }
+        return;
+    } else {
+        if (chroma_together<From>(src_u, src_v) && chroma_together<To>(dst_u, dst_v)) {
+            constexpr int reach = overreach<From>() > overreach<To>() ? overreach<From>() : overreach<To>();
+            for (; i + kBlock + reach <= count; i += kBlock) {
+                store_chroma<To>(dst_u + i * To, dst_v + i * To, load_chroma<From>(src_u + i * From, src_v + i * From));
+            }
+        }
+    }
+    chroma_row_reference(src_u + i * From, src_v + i * From, src_step, dst_u + i * To, dst_v + i * To, dst_step,
+                         static_cast<int>(count - i));
+}
+
+template <size_t... I>
+constexpr std::array<ChromaRow, sizeof...(I)> chroma_table(std::index_sequence<I...>) {
+    return {chroma_row<kChromaSteps[I / 3], kChromaSteps[I % 3]>...};
+}
+constexpr auto kChromaRows = chroma_table(std::make_index_sequence<9>());
+
+// Selectors ------------------------------------------------------------------
+
+bool valid_rgb_index(int index) { return index >= 0 && index < kRgbFormatCount; }
+bool valid_luma_step(int step) { return step == 1 || step == 2; }
+
+RgbToRgbRow neon_rgb_to_rgb(int src_index, int dst_index) {
+    if (!valid_rgb_index(src_index) || !valid_rgb_index(dst_index)) return nullptr;
+    return kRgbToRgbRows[src_index * kRgbFormatCount + dst_index];
+}
+
+RgbToLumaRow neon_rgb_to_luma(int src_index, int luma_step) {
+    if (!valid_rgb_index(src_index) || !valid_luma_step(luma_step)) return nullptr;
+    return kRgbToLumaRows[src_index * 2 + luma_step - 1];
+}
+
+RgbToChromaRow neon_rgb_to_chroma(int src_index, int chroma_step) {
+    const int step = chroma_step_index(chroma_step);
+    if (!valid_rgb_index(src_index) || step < 0) return nullptr;
+    return kRgbToChromaRows[src_index * 3 + step];
+}
+
+YuvToRgbRow neon_yuv_to_rgb(int dst_index, int luma_step, int chroma_step, int rows) {
+    if (!valid_rgb_index(dst_index)) return nullptr;
+    for (int i = 0; i < kYuvSourceShapeCount; ++i) {
+        const YuvSourceShape& shape = kYuvSourceShapes[i];
+        if (shape.lumaStep == luma_step && shape.chromaStep == chroma_step && shape.rows == rows) {
+            return kYuvToRgbRows[dst_index * kYuvSourceShapeCount + i];
+        }
+    }
+    return nullptr;
+}
+
+GreyToRgbRow neon_grey_to_rgb(int dst_index) { return valid_rgb_index(dst_index) ? kGreyToRgbRows[dst_index] : nullptr; }
+
+SampleRow neon_sample(int src_step, int dst_step) {
+    if (!valid_luma_step(src_step) || !valid_luma_step(dst_step)) return nullptr;
+    return kSampleRows[(src_step - 1) * 2 + dst_step - 1];
+}
+
+ChromaRow neon_chroma(int src_step, int dst_step) {
+    const int src = chroma_step_index(src_step);
+    const int dst = chroma_step_index(dst_step);
+    if (src < 0 || dst < 0) return nullptr;
+    return kChromaRows[src * 3 + dst];
+}
+
+}  // namespace
+
+const RowKernelSet kNeonRows = {"neon",          neon_rgb_to_rgb,  neon_rgb_to_luma, neon_rgb_to_chroma,
+                                neon_yuv_to_rgb, neon_grey_to_rgb, neon_sample,      neon_chroma};
+
+}  // namespace qk
