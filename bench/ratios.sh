@@ -32,7 +32,8 @@ for run in json.load(open(sys.argv[1]))["benchmarks"]:
     # The median when repeated, the single run otherwise.
     if run.get("run_type") == "aggregate" and run.get("aggregate_name") != "median":
         continue
-    _, operation, side, width, height = run["run_name"].split("/")
+    # BM_Yuv/<operation>/<side>/<width>/<height>[/real_time]
+    operation, side, width, height = run["run_name"].split("/")[1:5]
     key = (operation, f"{width}x{height}")
     rates.setdefault(key, {})[side] = run["Mpixel/s"]
     here = (run["family_index"], run["per_family_instance_index"])

@@ -2,10 +2,11 @@
 // on the same frames at 1920x1080 and 4000x3000: "BM_Yuv/<operation>/ours/W/H"
 // next to "BM_Yuv/<operation>/libyuv/W/H". Both sides run single-threaded on
 // the caller's plain malloc'ed buffers (CallerFrame), ours wrapped and
-// reached through the exported functions, nothing allocated per call; rates
-// are per second of wall-clock time, as a caller sees them. libyuv works in
-// limited range and rounds its own way: compare speed only. bench/ratios.sh
-// prints the pairs as a table.
+// reached through the exported functions, nothing allocated per call. Rates
+// are per second of CPU time, which other work on a shared machine disturbs
+// less than the wall-clock rates of BM_Convert. libyuv works in limited
+// range and rounds its own way: compare speed only. bench/ratios.sh prints
+// the pairs as a table.
 //
 // libyuv names its packed formats after a 32-bit word, so its bytes in
 // memory run the other way: libyuv ARGB is our BGRA, ABGR our RGBA, RAW our
@@ -163,7 +164,7 @@ void BM_Yuv(benchmark::State& state, const Operation& op, bool ours) {
     for (const Operation& op : kOperations) {
         for (bool ours : {true, false}) {
             const std::string name = std::string("BM_Yuv/") + op.name + (ours ? "/ours" : "/libyuv");
-            benchmark::RegisterBenchmark(name.c_str(), BM_Yuv, op, ours)->Apply(frame_sizes)->UseRealTime();
+            benchmark::RegisterBenchmark(name.c_str(), BM_Yuv, op, ours)->Apply(frame_sizes);
         }
     }
     return true;
