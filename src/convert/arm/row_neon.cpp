@@ -179,40 +179,43 @@ constexpr auto kGreyToRgbRows = grey_to_rgb_table(std::make_index_sequence<kRgbF
 
 // RGB to YUV -----------------------------------------------------------------
 
-// rgb_luma of 16 pixels: the weighted sum needs 32 bits.
-inline uint16x4_t luma_part(uint16x4_t r, uint16x4_t g, uint16x4_t b) {
-    uint32x4_t sum = vmull_n_u16(r, 19595);
-    sum = vmlal_n_u16(sum, g, 38470);
-    sum = vmlal_n_u16(sum, b, 7471);
-    return vshrn_n_u32(sum, 16);
-}
-inline uint16x8_t luma_half(uint8x8_t r, uint8x8_t g, uint8x8_t b) {
-    const uint16x8_t r16 = vmovl_u8(r), g16 = vmovl_u8(g), b16 = vmovl_u8(b);
-    return vcombine_u16(luma_part(vget_low_u16(r16), vget_low_u16(g16), vget_low_u16(b16)),
-                        luma_part(vget_high_u16(r16), vget_high_u16(g16), vget_high_u16(b16)));
-}
+// rgb_luma in 16-bit lanes: 19595 r + 38470 g + 7471 b is 256 H + L with
+// H = 76 r + 150 g + 29 b and L = 139 r + 70 g + 47 b, each below 2^16, and
+// its 16-bit shift is (H + (L >> 8)) >> 8, which stays below 2^16 too.
+inline uint8x8_t luma_high(uint16x8_t high, uint16x8_t low) { return vshrn_n_u16(vsraq_n_u16(high, low, 8), 8); }
 inline uint8x16_t luma16(const Pixels& px) {
-    return vcombine_u8(vmovn_u16(luma_half(vget_low_u8(px.r), vget_low_u8(px.g), vget_low_u8(px.b))),
-                       vmovn_u16(luma_half(vget_high_u8(px.r), vget_high_u8(px.g), vget_high_u8(px.b))));
+    const uint8x8_t r = vget_low_u8(px.r), g = vget_low_u8(px.g), b = vget_low_u8(px.b);
+    const uint8x8_t h76 = vdup_n_u8(76), h150 = vdup_n_u8(150), h29 = vdup_n_u8(29);
+    const uint8x8_t l139 = vdup_n_u8(139), l70 = vdup_n_u8(70), l47 = vdup_n_u8(47);
+    const uint16x8_t high0 = vmlal_u8(vmlal_u8(vmull_u8(r, h76), g, h150), b, h29);
+    const uint16x8_t low0 = vmlal_u8(vmlal_u8(vmull_u8(r, l139), g, l70), b, l47);
+    const uint16x8_t high1 = vmlal_high_u8(vmlal_high_u8(vmull_high_u8(px.r, vdupq_n_u8(76)), px.g, vdupq_n_u8(150)),
+                                           px.b, vdupq_n_u8(29));
+    const uint16x8_t low1 = vmlal_high_u8(vmlal_high_u8(vmull_high_u8(px.r, vdupq_n_u8(139)), px.g, vdupq_n_u8(70)),
+                                          px.b, vdupq_n_u8(47));
+    return vcombine_u8(luma_high(high0, low0), luma_high(high1, low1));
 }
+static_assert(76 * 256 + 139 == 19595 && 150 * 256 + 70 == 38470 && 29 * 256 + 47 == 7471 &&
+                  255 * (76 + 150 + 29) + 255 < 65536 && 255 * (139 + 70 + 47) < 65536,
+              "the luma weights split into two 16-bit sums");
 
-// rgb_chroma_u/v of 16 pixels. The weight w (36962 or 46727) does not fit a
-// signed 16-bit lane, so d * w >> 16 is taken as (d * (w - 65536) >> 16) + d:
+// rgb_chroma_u and rgb_chroma_v of 16 pixels from d = channel - luma.
+// d * 36962 >> 16 is one doubling multiply-high by 18481. 46727 is odd and
+// above a signed lane: d * 46727 >> 16 is (d * (46727 - 65536) >> 16) + d,
 // the same floor, as d * 65536 divides exactly.
-template <int16_t WeightLess65536>
-inline int16x8_t chroma_half(int16x8_t d) {
-    const int16x8_t scaled = vcombine_s16(vshrn_n_s32(vmull_n_s16(vget_low_s16(d), WeightLess65536), 16),
-                                          vshrn_n_s32(vmull_high_n_s16(d, WeightLess65536), 16));
+inline int16x8_t chroma_u_half(int16x8_t d) { return vaddq_s16(vqdmulhq_n_s16(d, 18481), vdupq_n_s16(128)); }
+inline int16x8_t chroma_v_half(int16x8_t d) {
+    constexpr int16_t kWeight = 46727 - 65536;
+    const int16x8_t scaled = vcombine_s16(vshrn_n_s32(vmull_n_s16(vget_low_s16(d), kWeight), 16),
+                                          vshrn_n_s32(vmull_high_n_s16(d, kWeight), 16));
     return vaddq_s16(vaddq_s16(scaled, d), vdupq_n_s16(128));
 }
-template <int16_t WeightLess65536>
+template <int16x8_t (*Half)(int16x8_t)>
 inline uint8x16_t chroma16(uint8x16_t channel, uint8x16_t luma) {
     const int16x8_t low = vreinterpretq_s16_u16(vsubl_u8(vget_low_u8(channel), vget_low_u8(luma)));
     const int16x8_t high = vreinterpretq_s16_u16(vsubl_high_u8(channel, luma));
-    return vqmovun_high_s16(vqmovun_s16(chroma_half<WeightLess65536>(low)), chroma_half<WeightLess65536>(high));
+    return vqmovun_high_s16(vqmovun_s16(Half(low)), Half(high));
 }
-constexpr int16_t kUWeight = 36962 - 65536;
-constexpr int16_t kVWeight = 46727 - 65536;
 
 template <int S, int Step>
 void rgb_to_luma(const uint8_t* rgb, uint8_t* luma, int width, const RgbToYuvShape& shape) {
@@ -250,7 +253,7 @@ void rgb_to_chroma(const uint8_t* rgb, uint8_t* u, uint8_t* v, int pairs, const 
                               vuzp1q_u8(first.b, second.b), {}};
             const uint8x16_t y = luma16(left);
             store_chroma<Step>(u + j * Step, v + j * Step,
-                               Chroma{chroma16<kUWeight>(left.b, y), chroma16<kVWeight>(left.r, y)});
+                               Chroma{chroma16<chroma_u_half>(left.b, y), chroma16<chroma_v_half>(left.r, y)});
         }
     }
     rgb_to_chroma_row_reference(rgb + 2 * j * in, u + j * Step, v + j * Step, static_cast<int>(pairs - j), shape);
@@ -277,32 +280,34 @@ int chroma_step_index(int step) {
 // v = V - 128), each pixel clamp(Y + offset); the pair U = 28, V = 228 takes
 // the double path. Red and blue in 16-bit lanes: floor(1.402 v) is
 // v + (v * 26346 >> 16) and floor(1.772 u) is 2u + (u * -14942 >> 16) for
-// every u, v in [-128, 127] (checked below), one doubling multiply-high each.
-// Green exactly as row_fast.cpp's green_offset: the exact numerator
-// -34414 u - 71414 v, shifted by 200 * 100000 to be non-negative, divided by
-// 32 and then by 3125 through a multiply-high with ceil(2^31 / 3125) = 687195,
-// which is exact below 2^31 / 727 (the rounding excess of 687195 * 3125),
-// and the shifted values stay below 2^20.
+// every u, v in [-128, 127], one doubling multiply-high each. Green is
+// floor(n / 50000) for the exact half numerator
+// n = -17207 u - 35707 v = -17207 (u + 2v) - 1293 v (two 16-bit
+// multiply-adds into 32 bits), made non-negative by 100 * 100000, divided by
+// 16 and then by 3125 through a doubling multiply-high with
+// ceil(2^31 / 3125) = 687195 (exact below 2^31 / 727, the rounding excess of
+// 687195 * 3125; the values stay below 2^20). Checked below for every pair.
 constexpr int16_t kRedHalf = 13173;   // 26346 / 2
 constexpr int16_t kBlueHalf = -7471;  // -14942 / 2
-constexpr int32_t kGreenBias = 200 * 100000;
+constexpr int32_t kGreenBias = 100 * 100000;
 constexpr int32_t kDiv3125 = 687195;
 
 constexpr int64_t floor_div(int64_t numerator, int64_t denominator) {
     const int64_t quotient = numerator / denominator;
     return quotient * denominator > numerator ? quotient - 1 : quotient;
 }
-// The lanes' arithmetic: a doubling multiply-high keeps bits 16.. (32..) of
-// twice the product; `>>` of a negative value is arithmetic with GCC and Clang.
+// A doubling multiply-high keeps bits 16.. (32..) of twice the product; `>>`
+// of a negative value is arithmetic with GCC and Clang, as in the lanes.
 constexpr int64_t doubling_high(int64_t a, int64_t b, int bits) { return (2 * a * b) >> bits; }
 constexpr bool integer_offsets_exact() {
     for (int u = -128; u < 128; ++u) {
         if (u + doubling_high(u, kRedHalf, 16) != floor_div(1402 * u, 1000)) return false;
         if (2 * u + doubling_high(u, kBlueHalf, 16) != floor_div(1772 * u, 1000)) return false;
         for (int v = -128; v < 128; ++v) {
-            const int32_t numerator = -34414 * u - 71414 * v;
-            const int64_t green = doubling_high((numerator + kGreenBias) >> 5, kDiv3125, 32) - 200;
-            if (green != floor_div(numerator, 100000)) return false;
+            const int32_t half = kGreenBias - 17207 * (u + 2 * v) - 1293 * v;
+            if (doubling_high(half >> 4, kDiv3125, 32) - 200 != floor_div(-34414 * u - 71414 * v, 100000)) {
+                return false;
+            }
         }
     }
     return true;
@@ -313,17 +318,16 @@ struct Offsets {
     int16x8_t r, g, b;  // one lane per chroma pair
 };
 
-inline int16x4_t green_part(int16x4_t u, int16x4_t v) {
-    const int32x4_t numerator = vmlaq_n_s32(vmulq_n_s32(vmovl_s16(u), -34414), vmovl_s16(v), -71414);
-    const int32x4_t shifted = vshrq_n_s32(vaddq_s32(numerator, vdupq_n_s32(kGreenBias)), 5);
-    return vmovn_s32(vqdmulhq_n_s32(shifted, kDiv3125));
-}
+inline int16x4_t green_quotient(int32x4_t half) { return vmovn_s32(vqdmulhq_n_s32(vshrq_n_s32(half, 4), kDiv3125)); }
 
 inline Offsets chroma_offsets(uint8x8_t u_bytes, uint8x8_t v_bytes) {
     const int16x8_t u = vreinterpretq_s16_u16(vsubl_u8(u_bytes, vdup_n_u8(128)));
     const int16x8_t v = vreinterpretq_s16_u16(vsubl_u8(v_bytes, vdup_n_u8(128)));
-    const int16x8_t green = vcombine_s16(green_part(vget_low_s16(u), vget_low_s16(v)),
-                                         green_part(vget_high_s16(u), vget_high_s16(v)));
+    const int16x8_t u2v = vaddq_s16(u, vaddq_s16(v, v));
+    const int32x4_t bias = vdupq_n_s32(kGreenBias);
+    const int32x4_t low = vmlal_n_s16(vmlal_n_s16(bias, vget_low_s16(u2v), -17207), vget_low_s16(v), -1293);
+    const int32x4_t high = vmlal_high_n_s16(vmlal_high_n_s16(bias, u2v, -17207), v, -1293);
+    const int16x8_t green = vcombine_s16(green_quotient(low), green_quotient(high));
     return {vaddq_s16(v, vqdmulhq_n_s16(v, kRedHalf)), vsubq_s16(green, vdupq_n_s16(200)),
             vaddq_s16(vaddq_s16(u, u), vqdmulhq_n_s16(u, kBlueHalf))};
 }
