@@ -19,6 +19,10 @@
 
 #include "convert/row.h"
 
+// The helpers of the kernels: always inlined, so that vectors stay in
+// registers and constants are loaded once per row.
+#define QK_SIMD [[gnu::always_inline]] inline
+
 namespace qk {
 namespace {
 
@@ -26,24 +30,24 @@ constexpr int kBlock = 16;
 
 // Two signed 16-bit factors, low and high half of every 32-bit lane, for
 // _mm_madd_epi16.
-__m128i factors(int low, int high) {
+QK_SIMD __m128i factors(int low, int high) {
     return _mm_set1_epi32(
         static_cast<int32_t>(uint32_t{static_cast<uint16_t>(high)} << 16 | static_cast<uint16_t>(low)));
 }
 
 // Loads and stores of 16 bytes at any alignment.
-__m128i load(const uint8_t* p) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
-void store(uint8_t* p, __m128i value) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), value); }
+QK_SIMD __m128i load(const uint8_t* p) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
+QK_SIMD void store(uint8_t* p, __m128i value) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), value); }
 
 // 16 bytes of each word's low byte and 16 of its high byte, from 32 bytes.
-void split_pairs(__m128i a, __m128i b, __m128i* low, __m128i* high) {
+QK_SIMD void split_pairs(__m128i a, __m128i b, __m128i* low, __m128i* high) {
     const __m128i low_bytes = _mm_set1_epi16(0x00ff);
     *low = _mm_packus_epi16(_mm_and_si128(a, low_bytes), _mm_and_si128(b, low_bytes));
     *high = _mm_packus_epi16(_mm_srli_epi16(a, 8), _mm_srli_epi16(b, 8));
 }
 
 // Stores 16 bytes into the even bytes of 32 at p, keeping the odd ones.
-void store_even_bytes(uint8_t* p, __m128i value) {
+QK_SIMD void store_even_bytes(uint8_t* p, __m128i value) {
     const __m128i keep = _mm_set1_epi16(static_cast<int16_t>(0xff00));
     const __m128i zero = _mm_setzero_si128();
     store(p, _mm_or_si128(_mm_and_si128(load(p), keep), _mm_unpacklo_epi8(value, zero)));
@@ -55,14 +59,14 @@ void store_even_bytes(uint8_t* p, __m128i value) {
 // U and V of `step` 2 lie next to each other, of step 4 two bytes apart (in
 // the pixel pairs of packed 4:2:2): every format's layout, checked because
 // the kernels address both through the lower one.
-bool chroma_paired(const uint8_t* u, const uint8_t* v, int step) {
+QK_SIMD bool chroma_paired(const uint8_t* u, const uint8_t* v, int step) {
     const ptrdiff_t apart = u < v ? v - u : u - v;
     return step == 1 || apart == step / 2;
 }
 
 // 16 U and 16 V samples, from sample i on.
 template <int Step>
-void load_chroma(const uint8_t* u, const uint8_t* v, ptrdiff_t i, __m128i* u_out, __m128i* v_out) {
+QK_SIMD void load_chroma(const uint8_t* u, const uint8_t* v, ptrdiff_t i, __m128i* u_out, __m128i* v_out) {
     if constexpr (Step == 1) {
         *u_out = load(u + i);
         *v_out = load(v + i);
@@ -81,7 +85,7 @@ void load_chroma(const uint8_t* u, const uint8_t* v, ptrdiff_t i, __m128i* u_out
 }
 
 template <int Step>
-void store_chroma(uint8_t* u, uint8_t* v, ptrdiff_t i, __m128i u_in, __m128i v_in) {
+QK_SIMD void store_chroma(uint8_t* u, uint8_t* v, ptrdiff_t i, __m128i u_in, __m128i v_in) {
     if constexpr (Step == 1) {
         store(u + i, u_in);
         store(v + i, v_in);
@@ -158,7 +162,7 @@ SampleRow ssse3_sample(int src_step, int dst_step) {
 struct ByteMask {
     int8_t byte[16];
 };
-__m128i load(const ByteMask& mask) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(mask.byte)); }
+QK_SIMD __m128i load(const ByteMask& mask) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(mask.byte)); }
 
 // Blocks of 16 pixels travel as four vectors of four pixels each, packed
 // from byte 0 (3-byte pixels leave bytes 12 to 15 zero).
@@ -185,7 +189,7 @@ constexpr ByteMask alpha_bits(RgbLayout s, RgbLayout d) {
 }
 
 template <int Bpp>
-void load_pixels(const uint8_t* p, __m128i v[4]) {
+QK_SIMD void load_pixels(const uint8_t* p, __m128i v[4]) {
     if constexpr (Bpp == 4) {
         for (int k = 0; k < 4; ++k) v[k] = load(p + 16 * k);
     } else {
@@ -198,7 +202,7 @@ void load_pixels(const uint8_t* p, __m128i v[4]) {
 }
 
 template <int Bpp>
-void store_pixels(uint8_t* p, const __m128i v[4]) {
+QK_SIMD void store_pixels(uint8_t* p, const __m128i v[4]) {
     if constexpr (Bpp == 4) {
         for (int k = 0; k < 4; ++k) store(p + 16 * k, v[k]);
     } else {
@@ -240,7 +244,7 @@ constexpr ByteMask channel_pair_mask(RgbLayout s, int first_offset) {
 // The luma of four pixels (R, G) and (B, G), 32-bit lanes: the weights add
 // up to 65536, and 38470 for G, too big for a signed 16-bit factor, is
 // split between the two pairs.
-__m128i luma32(__m128i rg, __m128i bg) {
+QK_SIMD __m128i luma32(__m128i rg, __m128i bg) {
     const __m128i rg_weights = factors(19595, 19235);
     const __m128i bg_weights = factors(7471, 19235);
     return _mm_srli_epi32(_mm_add_epi32(_mm_madd_epi16(rg, rg_weights), _mm_madd_epi16(bg, bg_weights)), 16);
@@ -248,7 +252,7 @@ __m128i luma32(__m128i rg, __m128i bg) {
 
 // 16 bytes from four vectors of four 32-bit values in 0..255 (clamped
 // otherwise).
-__m128i pack_bytes(__m128i a, __m128i b, __m128i c, __m128i d) {
+QK_SIMD __m128i pack_bytes(__m128i a, __m128i b, __m128i c, __m128i d) {
     return _mm_packus_epi16(_mm_packs_epi32(a, b), _mm_packs_epi32(c, d));
 }
 
@@ -288,7 +292,7 @@ constexpr ByteMask even_pixel_mask(RgbLayout s, int first_offset, bool high) {
 // ((x - luma) * factor) >> 16, + 128, for 32-bit x and luma in 0..255: the
 // difference fits 16 bits and goes into both halves of its lane, where the
 // two halves of `factor` multiply and add it.
-__m128i chroma32(__m128i x, __m128i luma, __m128i factor) {
+QK_SIMD __m128i chroma32(__m128i x, __m128i luma, __m128i factor) {
     const __m128i diff = _mm_sub_epi32(x, luma);
     const __m128i both = _mm_or_si128(_mm_and_si128(diff, _mm_set1_epi32(0xffff)), _mm_slli_epi32(diff, 16));
     return _mm_add_epi32(_mm_srai_epi32(_mm_madd_epi16(both, factor), 16), _mm_set1_epi32(128));
@@ -342,16 +346,16 @@ struct ChromaOffsets {
 
 // Four 32-bit products c * k of the 16-bit c in lanes `c2` (c repeated in
 // both halves of each lane) with k = low + high.
-__m128i times(__m128i c2, int low, int high) { return _mm_madd_epi16(c2, factors(low, high)); }
+QK_SIMD __m128i times(__m128i c2, int low, int high) { return _mm_madd_epi16(c2, factors(low, high)); }
 
-__m128i divide_by_50000(__m128i x) {
+QK_SIMD __m128i divide_by_50000(__m128i x) {
     const __m128i reciprocal = _mm_set1_epi32(21990233);
     const __m128i even = _mm_srli_epi64(_mm_mul_epu32(x, reciprocal), 40);
     const __m128i odd = _mm_slli_epi64(_mm_srli_epi64(_mm_mul_epu32(_mm_srli_epi64(x, 32), reciprocal), 40), 32);
     return _mm_or_si128(even, odd);
 }
 
-ChromaOffsets chroma_offsets(__m128i u8, __m128i v8) {
+QK_SIMD ChromaOffsets chroma_offsets(__m128i u8, __m128i v8) {
     const __m128i zero = _mm_setzero_si128(), bias = _mm_set1_epi16(128);
     const __m128i u = _mm_sub_epi16(_mm_unpacklo_epi8(u8, zero), bias);
     const __m128i v = _mm_sub_epi16(_mm_unpacklo_epi8(v8, zero), bias);
@@ -373,7 +377,7 @@ ChromaOffsets chroma_offsets(__m128i u8, __m128i v8) {
 // 16 pixels of one row: their luma and the offsets of their 8 pairs, stored
 // in layout D.
 template <int D>
-void store_row(uint8_t* dst, __m128i luma, const ChromaOffsets& c) {
+QK_SIMD void store_row(uint8_t* dst, __m128i luma, const ChromaOffsets& c) {
     constexpr RgbLayout d = kFormats[D].rgb;
     static constexpr ByteMask kReorder = reorder_mask(kCanonical, d);
     const __m128i zero = _mm_setzero_si128();
@@ -395,7 +399,7 @@ void store_row(uint8_t* dst, __m128i luma, const ChromaOffsets& c) {
 }
 
 template <int LumaStep>
-__m128i load_luma(const uint8_t* luma) {
+QK_SIMD __m128i load_luma(const uint8_t* luma) {
     if constexpr (LumaStep == 1) {
         return load(luma);
     } else {
@@ -407,7 +411,7 @@ __m128i load_luma(const uint8_t* luma) {
 
 // Eight U and eight V samples in the low halves.
 template <int Step>
-void load_chroma8(const uint8_t* u, const uint8_t* v, ptrdiff_t j, __m128i* u_out, __m128i* v_out) {
+QK_SIMD void load_chroma8(const uint8_t* u, const uint8_t* v, ptrdiff_t j, __m128i* u_out, __m128i* v_out) {
     if constexpr (Step == 1) {
         *u_out = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(u + j));
         *v_out = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(v + j));
