@@ -12,6 +12,7 @@
 #include <string.h>
 
 #include <array>
+#include <type_traits>
 #include <utility>
 
 #include "convert/pixel.h"
@@ -97,34 +98,45 @@ struct Chroma {
     uint8x16_t u, v;
 };
 
+// Whether U comes first, in a row of steps 2 and 4 (the kernels' block
+// loops are compiled for each order); planes count as U first.
 template <int Step>
+inline bool u_first(const uint8_t* u, const uint8_t* v) {
+    return Step == 1 || u < v;
+}
+using UFirst = std::true_type;
+using VFirst = std::false_type;
+
+template <int Step, bool UIsFirst>
 inline Chroma load_chroma(const uint8_t* u, const uint8_t* v) {
+    constexpr int second = Step / 2;  // vector of the second sample
     if constexpr (Step == 1) {
         return {vld1q_u8(u), vld1q_u8(v)};
     } else if constexpr (Step == 2) {
-        const uint8x16x2_t in = vld2q_u8(u < v ? u : v);
-        return u < v ? Chroma{in.val[0], in.val[1]} : Chroma{in.val[1], in.val[0]};
+        const uint8x16x2_t in = vld2q_u8(UIsFirst ? u : v);
+        return {in.val[UIsFirst ? 0 : second], in.val[UIsFirst ? second : 0]};
     } else {
-        const uint8x16x4_t in = vld4q_u8(u < v ? u : v);
-        return u < v ? Chroma{in.val[0], in.val[2]} : Chroma{in.val[2], in.val[0]};
+        const uint8x16x4_t in = vld4q_u8(UIsFirst ? u : v);
+        return {in.val[UIsFirst ? 0 : second], in.val[UIsFirst ? second : 0]};
     }
 }
 
-template <int Step>
+template <int Step, bool UIsFirst>
 inline void store_chroma(uint8_t* u, uint8_t* v, const Chroma& c) {
+    constexpr int second = Step / 2;
     if constexpr (Step == 1) {
         vst1q_u8(u, c.u);
         vst1q_u8(v, c.v);
     } else if constexpr (Step == 2) {
         uint8x16x2_t out;
-        out.val[u < v ? 0 : 1] = c.u;
-        out.val[u < v ? 1 : 0] = c.v;
-        vst2q_u8(u < v ? u : v, out);
+        out.val[UIsFirst ? 0 : second] = c.u;
+        out.val[UIsFirst ? second : 0] = c.v;
+        vst2q_u8(UIsFirst ? u : v, out);
     } else {
-        uint8_t* first = u < v ? u : v;
+        uint8_t* first = UIsFirst ? u : v;
         uint8x16x4_t block = vld4q_u8(first);
-        block.val[u < v ? 0 : 2] = c.u;
-        block.val[u < v ? 2 : 0] = c.v;
+        block.val[UIsFirst ? 0 : second] = c.u;
+        block.val[UIsFirst ? second : 0] = c.v;
         vst4q_u8(first, block);
     }
 }
@@ -145,10 +157,45 @@ void copy_rgb(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape&)
     if (width > 0) memcpy(dst, src, static_cast<size_t>(width) * layout<F>().bytesPerPixel);
 }
 
+// 4-byte to 4-byte pixels: the same four bytes in another order, one table
+// lookup per 4 pixels, cheaper than de-interleaving loads and stores.
+struct ByteOrder {
+    uint8_t index[16];
+};
+template <int S, int D>
+constexpr ByteOrder byte_order() {
+    constexpr RgbLayout s = layout<S>(), d = layout<D>();
+    ByteOrder order{};
+    for (int pixel = 0; pixel < 4; ++pixel) {
+        uint8_t* out = order.index + 4 * pixel;
+        const int in = 4 * pixel;
+        out[d.rOffset] = static_cast<uint8_t>(in + s.rOffset);
+        out[d.gOffset] = static_cast<uint8_t>(in + s.gOffset);
+        out[d.bOffset] = static_cast<uint8_t>(in + s.bOffset);
+        out[d.aOffset] = static_cast<uint8_t>(in + s.aOffset);
+    }
+    return order;
+}
+
+template <int S, int D>
+void rgb4_to_rgb4(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape& shape) {
+    static constexpr ByteOrder kOrder = byte_order<S, D>();
+    const uint8x16_t order = vld1q_u8(kOrder.index);
+    ptrdiff_t x = 0;
+    for (; x + kBlock <= width; x += kBlock) {
+        uint8x16x4_t pixels = vld1q_u8_x4(src + 4 * x);
+        for (uint8x16_t& four : pixels.val) four = vqtbl1q_u8(four, order);
+        vst1q_u8_x4(dst + 4 * x, pixels);
+    }
+    rgb_to_rgb_row_reference(src + 4 * x, dst + 4 * x, static_cast<int>(width - x), shape);
+}
+
 template <int S, int D>
 constexpr RgbToRgbRow rgb_to_rgb_variant() {
     if constexpr (S == D) {
         return copy_rgb<S>;
+    } else if constexpr (layout<S>().bytesPerPixel == 4 && layout<D>().bytesPerPixel == 4) {
+        return rgb4_to_rgb4<S, D>;
     } else {
         return rgb_to_rgb<S, D>;
     }
@@ -245,17 +292,19 @@ template <int S, int Step>
 void rgb_to_chroma(const uint8_t* rgb, uint8_t* u, uint8_t* v, int pairs, const RgbToYuvShape& shape) {
     constexpr ptrdiff_t in = layout<S>().bytesPerPixel;
     ptrdiff_t j = 0;
-    if (chroma_together<Step>(u, v)) {
+    const auto blocks = [&](auto order) {
         for (; j + kBlock + overreach<Step>() <= pairs; j += kBlock) {
             const Pixels first = load_pixels<S>(rgb + 2 * j * in);
             const Pixels second = load_pixels<S>(rgb + (2 * j + kBlock) * in);
             const Pixels left{vuzp1q_u8(first.r, second.r), vuzp1q_u8(first.g, second.g),
                               vuzp1q_u8(first.b, second.b), {}};
             const uint8x16_t y = luma16(left);
-            store_chroma<Step>(u + j * Step, v + j * Step,
-                               Chroma{chroma16<chroma_u_half>(left.b, y), chroma16<chroma_v_half>(left.r, y)});
+            store_chroma<Step, decltype(order)::value>(
+                u + j * Step, v + j * Step,
+                Chroma{chroma16<chroma_u_half>(left.b, y), chroma16<chroma_v_half>(left.r, y)});
         }
-    }
+    };
+    if (chroma_together<Step>(u, v)) u_first<Step>(u, v) ? blocks(UFirst{}) : blocks(VFirst{});
     rgb_to_chroma_row_reference(rgb + 2 * j * in, u + j * Step, v + j * Step, static_cast<int>(pairs - j), shape);
 }
 
@@ -333,9 +382,11 @@ inline Offsets chroma_offsets(uint8x8_t u_bytes, uint8x8_t v_bytes) {
 }
 
 // clamp(Y + offset) of 16 pixels, pixel 2k and 2k + 1 taking lane k.
+// A widening add: the sum's bits are the same for signed and unsigned lanes.
 inline uint8x16_t channel(uint8x16_t luma, int16x8_t offset) {
-    const int16x8_t low = vaddq_s16(vreinterpretq_s16_u16(vmovl_u8(vget_low_u8(luma))), vzip1q_s16(offset, offset));
-    const int16x8_t high = vaddq_s16(vreinterpretq_s16_u16(vmovl_high_u8(luma)), vzip2q_s16(offset, offset));
+    const uint16x8_t pairs = vreinterpretq_u16_s16(offset);
+    const int16x8_t low = vreinterpretq_s16_u16(vaddw_u8(vzip1q_u16(pairs, pairs), vget_low_u8(luma)));
+    const int16x8_t high = vreinterpretq_s16_u16(vaddw_high_u8(vzip2q_u16(pairs, pairs), luma));
     return vqmovun_high_s16(vqmovun_s16(low), high);
 }
 
@@ -356,41 +407,46 @@ void yuv_to_rgb(const uint8_t* y0, const uint8_t* y1, const uint8_t* u, const ui
                 uint8_t* d1, int width, const YuvToRgbShape& shape) {
     constexpr ptrdiff_t out = layout<D>().bytesPerPixel;
     constexpr int kPairs = kBlock / 2;
-    bool vectors = chroma_together<ChromaStep>(u, v);
-    if constexpr (LumaStep == 2) vectors = vectors && (u < v ? u : v) == y0 + 1;
     ptrdiff_t x = 0;
-    for (; vectors && x + kBlock <= width; x += kBlock) {
-        const ptrdiff_t j = x / 2;
-        uint8x8_t u_bytes, v_bytes;
-        uint8x16_t luma0;
-        if constexpr (LumaStep == 2) {
-            const uint8x8x4_t in = vld4_u8(y0 + 2 * x);
-            const uint8x8x2_t luma = vzip_u8(in.val[0], in.val[2]);
-            luma0 = vcombine_u8(luma.val[0], luma.val[1]);
-            u_bytes = u < v ? in.val[1] : in.val[3];
-            v_bytes = u < v ? in.val[3] : in.val[1];
-        } else if constexpr (ChromaStep == 2) {
-            const uint8x8x2_t in = vld2_u8((u < v ? u : v) + 2 * j);
-            u_bytes = u < v ? in.val[0] : in.val[1];
-            v_bytes = u < v ? in.val[1] : in.val[0];
-            luma0 = vld1q_u8(y0 + x);
-        } else {
-            u_bytes = vld1_u8(u + j);
-            v_bytes = vld1_u8(v + j);
-            luma0 = vld1q_u8(y0 + x);
-        }
-        const Offsets offsets = chroma_offsets(u_bytes, v_bytes);
-        store_yuv_pixels<D>(d0 + x * out, luma0, offsets);
-        if constexpr (Rows == 2) store_yuv_pixels<D>(d1 + x * out, vld1q_u8(y1 + x), offsets);
-        if (any_double_path_pair(u_bytes, v_bytes)) {
-            for (ptrdiff_t k = j; k < j + kPairs; ++k) {
-                if (u[k * ChromaStep] != 28 || v[k * ChromaStep] != 228) continue;
-                yuv_to_rgb_row_reference(y0 + 2 * k * LumaStep, Rows == 2 ? y1 + 2 * k : nullptr, u + k * ChromaStep,
-                                         v + k * ChromaStep, d0 + 2 * k * out, Rows == 2 ? d1 + 2 * k * out : nullptr,
-                                         2, shape);
+    const auto blocks = [&](auto order) {
+        constexpr bool kUFirst = decltype(order)::value;
+        for (; x + kBlock <= width; x += kBlock) {
+            const ptrdiff_t j = x / 2;
+            uint8x8_t u_bytes, v_bytes;
+            uint8x16_t luma0;
+            if constexpr (LumaStep == 2) {
+                const uint8x8x4_t in = vld4_u8(y0 + 2 * x);
+                const uint8x8x2_t luma = vzip_u8(in.val[0], in.val[2]);
+                luma0 = vcombine_u8(luma.val[0], luma.val[1]);
+                u_bytes = in.val[kUFirst ? 1 : 3];
+                v_bytes = in.val[kUFirst ? 3 : 1];
+            } else if constexpr (ChromaStep == 2) {
+                const uint8x8x2_t in = vld2_u8((kUFirst ? u : v) + 2 * j);
+                u_bytes = in.val[kUFirst ? 0 : 1];
+                v_bytes = in.val[kUFirst ? 1 : 0];
+                luma0 = vld1q_u8(y0 + x);
+            } else {
+                u_bytes = vld1_u8(u + j);
+                v_bytes = vld1_u8(v + j);
+                luma0 = vld1q_u8(y0 + x);
+            }
+            const Offsets offsets = chroma_offsets(u_bytes, v_bytes);
+            store_yuv_pixels<D>(d0 + x * out, luma0, offsets);
+            if constexpr (Rows == 2) store_yuv_pixels<D>(d1 + x * out, vld1q_u8(y1 + x), offsets);
+            if (any_double_path_pair(u_bytes, v_bytes)) {
+                for (ptrdiff_t k = j; k < j + kPairs; ++k) {
+                    if (u[k * ChromaStep] != 28 || v[k * ChromaStep] != 228) continue;
+                    yuv_to_rgb_row_reference(y0 + 2 * k * LumaStep, Rows == 2 ? y1 + 2 * k : nullptr,
+                                             u + k * ChromaStep, v + k * ChromaStep, d0 + 2 * k * out,
+                                             Rows == 2 ? d1 + 2 * k * out : nullptr, 2, shape);
+                }
             }
         }
-    }
+    };
+    const bool order_u = u_first<ChromaStep>(u, v);
+    bool vectors = chroma_together<ChromaStep>(u, v);
+    if constexpr (LumaStep == 2) vectors = vectors && (order_u ? u : v) == y0 + 1;
+    if (vectors) order_u ? blocks(UFirst{}) : blocks(VFirst{});
     yuv_to_rgb_row_reference(y0 + x * LumaStep, Rows == 2 ? y1 + x : nullptr, u + x / 2 * ChromaStep,
                              v + x / 2 * ChromaStep, d0 + x * out, Rows == 2 ? d1 + x * out : nullptr,
                              static_cast<int>(width - x), shape);
@@ -451,10 +507,18 @@ void chroma_row(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_
         return;
     } else {
         if (chroma_together<From>(src_u, src_v) && chroma_together<To>(dst_u, dst_v)) {
+            // U and V move alike: with both pairs swapped the source has U first.
+            const uint8_t *from_u = src_u, *from_v = src_v;
+            uint8_t *to_u = dst_u, *to_v = dst_v;
+            if (!u_first<From>(src_u, src_v)) std::swap(from_u, from_v), std::swap(to_u, to_v);
             constexpr int reach = overreach<From>() > overreach<To>() ? overreach<From>() : overreach<To>();
-            for (; i + kBlock + reach <= count; i += kBlock) {
-                store_chroma<To>(dst_u + i * To, dst_v + i * To, load_chroma<From>(src_u + i * From, src_v + i * From));
-            }
+            const auto blocks = [&](auto order) {
+                for (; i + kBlock + reach <= count; i += kBlock) {
+                    store_chroma<To, decltype(order)::value>(
+                        to_u + i * To, to_v + i * To, load_chroma<From, true>(from_u + i * From, from_v + i * From));
+                }
+            };
+            u_first<To>(to_u, to_v) ? blocks(UFirst{}) : blocks(VFirst{});
         }
     }
     chroma_row_reference(src_u + i * From, src_v + i * From, src_step, dst_u + i * To, dst_v + i * To, dst_step,
