@@ -9,6 +9,12 @@
 
 #include "platform/memory.h"
 
+#if defined(__SSE2__)
+#include <emmintrin.h>  // SSE2 (and the SSE float shuffles): the x86-64 baseline
+#elif defined(__ARM_NEON)
+#include <arm_neon.h>  // the AArch64 baseline
+#endif
+
 namespace qk {
 namespace platform {
 
@@ -21,8 +27,52 @@ inline void copy_run(uint8_t* dst, const uint8_t* src, ptrdiff_t step, int64_t c
     for (int64_t i = 0; i < count; ++i) memcpy(dst + i * kBitmapBytesPerPixel, src + i * step, kBitmapBytesPerPixel);
 }
 
-// Four pixels as one vector (GCC and Clang vector extensions: SSE2 on x86,
-// NEON on ARM).
+// Turns a 4x4 block: target pixel (c + j, r + i), at dst + i rows + j
+// pixels, shows the source pixel at src + i * step_r + j * step_c, step_r
+// being one pixel forwards or backwards. Four source runs of four pixels
+// are loaded along step_r and transposed; backwards, the transposed rows
+// are simply stored in the opposite order.
+#if defined(__SSE2__)
+inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, ptrdiff_t step_c, ptrdiff_t step_r) {
+    const bool backwards = step_r < 0;
+    const uint8_t* first = backwards ? src + 3 * step_r : src;
+    const __m128i v0 = _mm_loadu_si128(reinterpret_cast<const __m128i*>(first));
+    const __m128i v1 = _mm_loadu_si128(reinterpret_cast<const __m128i*>(first + step_c));
+    const __m128i v2 = _mm_loadu_si128(reinterpret_cast<const __m128i*>(first + 2 * step_c));
+    const __m128i v3 = _mm_loadu_si128(reinterpret_cast<const __m128i*>(first + 3 * step_c));
+    const __m128i t0 = _mm_unpacklo_epi32(v0, v1);
+    const __m128i t1 = _mm_unpacklo_epi32(v2, v3);
+    const __m128i t2 = _mm_unpackhi_epi32(v0, v1);
+    const __m128i t3 = _mm_unpackhi_epi32(v2, v3);
+    // Lane i of v0..v3, for i = 0..3.
+    const __m128i lanes[4] = {_mm_unpacklo_epi64(t0, t1), _mm_unpackhi_epi64(t0, t1), _mm_unpacklo_epi64(t2, t3),
+                              _mm_unpackhi_epi64(t2, t3)};
+    for (int i = 0; i < 4; ++i) {
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(dst + i * dst_row_bytes), lanes[backwards ? 3 - i : i]);
+    }
+}
+#elif defined(__ARM_NEON)
+inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, ptrdiff_t step_c, ptrdiff_t step_r) {
+    const bool backwards = step_r < 0;
+    const uint8_t* first = backwards ? src + 3 * step_r : src;
+    const uint32x4_t v0 = vld1q_u32(reinterpret_cast<const uint32_t*>(first));
+    const uint32x4_t v1 = vld1q_u32(reinterpret_cast<const uint32_t*>(first + step_c));
+    const uint32x4_t v2 = vld1q_u32(reinterpret_cast<const uint32_t*>(first + 2 * step_c));
+    const uint32x4_t v3 = vld1q_u32(reinterpret_cast<const uint32_t*>(first + 3 * step_c));
+    // Lanes 0 and 2 of v0 and v1 interleaved in t01.val[0], lanes 1 and 3 in
+    // t01.val[1]; likewise v2 and v3.
+    const uint32x4x2_t t01 = vtrnq_u32(v0, v1);
+    const uint32x4x2_t t23 = vtrnq_u32(v2, v3);
+    const uint32x4_t lanes[4] = {vcombine_u32(vget_low_u32(t01.val[0]), vget_low_u32(t23.val[0])),
+                                 vcombine_u32(vget_low_u32(t01.val[1]), vget_low_u32(t23.val[1])),
+                                 vcombine_u32(vget_high_u32(t01.val[0]), vget_high_u32(t23.val[0])),
+                                 vcombine_u32(vget_high_u32(t01.val[1]), vget_high_u32(t23.val[1]))};
+    for (int i = 0; i < 4; ++i) {
+        vst1q_u32(reinterpret_cast<uint32_t*>(dst + i * dst_row_bytes), lanes[backwards ? 3 - i : i]);
+    }
+}
+#else
+// Other targets: GCC and Clang vector extensions.
 typedef uint32_t Lanes __attribute__((vector_size(16)));
 
 inline Lanes load_lanes(const uint8_t* p) {
@@ -31,31 +81,73 @@ inline Lanes load_lanes(const uint8_t* p) {
     return v;
 }
 
-// Turns a 4x4 block: target pixel (c + j, r + i), at dst + i rows + j
-// pixels, shows the source pixel at src + i * step_r + j * step_c, step_r
-// being one pixel forwards or backwards. The block is transposed four pixels
-// at a time.
 inline void turn_block(uint8_t* dst, size_t dst_row_bytes, const uint8_t* src, ptrdiff_t step_c, ptrdiff_t step_r) {
     const bool backwards = step_r < 0;
     const uint8_t* first = backwards ? src + 3 * step_r : src;
-    Lanes v0 = load_lanes(first);
-    Lanes v1 = load_lanes(first + step_c);
-    Lanes v2 = load_lanes(first + 2 * step_c);
-    Lanes v3 = load_lanes(first + 3 * step_c);
-    if (backwards) {
-        v0 = __builtin_shufflevector(v0, v0, 3, 2, 1, 0);
-        v1 = __builtin_shufflevector(v1, v1, 3, 2, 1, 0);
-        v2 = __builtin_shufflevector(v2, v2, 3, 2, 1, 0);
-        v3 = __builtin_shufflevector(v3, v3, 3, 2, 1, 0);
-    }
-    // Target row i is lane i of v0..v3.
+    const Lanes v0 = load_lanes(first);
+    const Lanes v1 = load_lanes(first + step_c);
+    const Lanes v2 = load_lanes(first + 2 * step_c);
+    const Lanes v3 = load_lanes(first + 3 * step_c);
     const Lanes t0 = __builtin_shufflevector(v0, v1, 0, 4, 1, 5);
     const Lanes t1 = __builtin_shufflevector(v2, v3, 0, 4, 1, 5);
     const Lanes t2 = __builtin_shufflevector(v0, v1, 2, 6, 3, 7);
     const Lanes t3 = __builtin_shufflevector(v2, v3, 2, 6, 3, 7);
-    const Lanes rows[4] = {__builtin_shufflevector(t0, t1, 0, 1, 4, 5), __builtin_shufflevector(t0, t1, 2, 3, 6, 7),
-                           __builtin_shufflevector(t2, t3, 0, 1, 4, 5), __builtin_shufflevector(t2, t3, 2, 3, 6, 7)};
-    for (int i = 0; i < 4; ++i) memcpy(dst + i * dst_row_bytes, &rows[i], sizeof(Lanes));
+    const Lanes lanes[4] = {__builtin_shufflevector(t0, t1, 0, 1, 4, 5), __builtin_shufflevector(t0, t1, 2, 3, 6, 7),
+                            __builtin_shufflevector(t2, t3, 0, 1, 4, 5), __builtin_shufflevector(t2, t3, 2, 3, 6, 7)};
+    for (int i = 0; i < 4; ++i) memcpy(dst + i * dst_row_bytes, &lanes[backwards ? 3 - i : i], sizeof(Lanes));
+}
+#endif
+
+// Target pixels [from, to) of a scaled row: pixel c takes the source pixel
+// offset[c] bytes into the source row.
+inline void gather_run(uint8_t* dst, const uint8_t* src, const uint32_t* offset, int64_t from, int64_t to) {
+    for (int64_t c = from; c < to; ++c) {
+        uint32_t pixel;
+        memcpy(&pixel, src + offset[c], sizeof(pixel));
+        memcpy(dst + c * kBitmapBytesPerPixel, &pixel, sizeof(pixel));
+    }
+}
+
+// Each of `count` source pixels twice.
+inline void double_run(uint8_t* dst, const uint8_t* src, int64_t count) {
+    int64_t i = 0;
+#if defined(__SSE2__)
+    for (; i + 4 <= count; i += 4) {
+        const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(src + i * kBitmapBytesPerPixel));
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(dst + 2 * i * kBitmapBytesPerPixel), _mm_unpacklo_epi32(v, v));
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(dst + (2 * i + 4) * kBitmapBytesPerPixel),
+                         _mm_unpackhi_epi32(v, v));
+    }
+#elif defined(__ARM_NEON)
+    for (; i + 4 <= count; i += 4) {
+        const uint32x4_t v = vld1q_u32(reinterpret_cast<const uint32_t*>(src + i * kBitmapBytesPerPixel));
+        vst2q_u32(reinterpret_cast<uint32_t*>(dst + 2 * i * kBitmapBytesPerPixel), uint32x4x2_t{{v, v}});
+    }
+#endif
+    for (; i < count; ++i) {
+        memcpy(dst + 2 * i * kBitmapBytesPerPixel, src + i * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
+        memcpy(dst + (2 * i + 1) * kBitmapBytesPerPixel, src + i * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
+    }
+}
+
+// `count` pixels: the second of each source pair.
+inline void halve_run(uint8_t* dst, const uint8_t* src, int64_t count) {
+    int64_t i = 0;
+#if defined(__SSE2__)
+    for (; i + 4 <= count; i += 4) {
+        const __m128 a = _mm_loadu_ps(reinterpret_cast<const float*>(src + 2 * i * kBitmapBytesPerPixel));
+        const __m128 b = _mm_loadu_ps(reinterpret_cast<const float*>(src + (2 * i + 4) * kBitmapBytesPerPixel));
+        _mm_storeu_ps(reinterpret_cast<float*>(dst + i * kBitmapBytesPerPixel), _mm_shuffle_ps(a, b, 0xDD));
+    }
+#elif defined(__ARM_NEON)
+    for (; i + 4 <= count; i += 4) {
+        const uint32x4x2_t pairs = vld2q_u32(reinterpret_cast<const uint32_t*>(src + 2 * i * kBitmapBytesPerPixel));
+        vst1q_u32(reinterpret_cast<uint32_t*>(dst + i * kBitmapBytesPerPixel), pairs.val[1]);
+    }
+#endif
+    for (; i < count; ++i) {
+        memcpy(dst + i * kBitmapBytesPerPixel, src + (2 * i + 1) * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
+    }
 }
 
 // The integers from lo up to, not including, hi.
@@ -303,6 +395,23 @@ bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t p
     return bitmap.reshape(turned_width, turned_height);
 }
 
+void turn_copy(const uint8_t* src, size_t src_row_bytes, int32_t width, int32_t height, int quarter_turns,
+               uint8_t* dst, size_t dst_row_bytes) {
+    if (width < 1 || height < 1) return;
+    // Target pixel (c, r) shows source (x0 + xc c + xr r, y0 + yc c + yr r).
+    TurnMap m;
+    const int q = ((quarter_turns % 4) + 4) % 4;
+    switch (q) {
+        case 0: break;
+        case 1: m.x0 = 0, m.xc = 0, m.xr = 1, m.y0 = height - 1, m.yc = -1, m.yr = 0; break;
+        case 2: m.x0 = width - 1, m.xc = -1, m.xr = 0, m.y0 = height - 1, m.yc = 0, m.yr = -1; break;
+        case 3: m.x0 = width - 1, m.xc = 0, m.xr = -1, m.y0 = 0, m.yc = 1, m.yr = 0; break;
+    }
+    const bool exchanged = q % 2 == 1;
+    draw_turn(m, SourceView{src, src_row_bytes, 0, width, height},
+              TargetView{dst, dst_row_bytes, exchanged ? height : width, 0, exchanged ? width : height});
+}
+
 void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& target) {
     if (!source.has_pixels() || !target.has_pixels() || !(scale_x > 0) || !(scale_y > 0)) return;
     // Maps a target index back to the source index under its centre.
@@ -320,16 +429,35 @@ void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& tar
     const int64_t width = target.width();
     for (int64_t c0 = 0; c0 < width; c0 += kStrip) {
         const int64_t count = std::min(kStrip, width - c0);
+        // Exact doubling (column c shows c / 2) and halving (2c + 1) are
+        // worth spotting: they move whole vectors instead of gathering.
+        bool doubled = true, halved = true;
         for (int64_t c = 0; c < count; ++c) {
-            column_offset[c] =
-                static_cast<uint32_t>(source_index(c0 + c, scale_x, source.width())) * kBitmapBytesPerPixel;
+            const uint32_t x = static_cast<uint32_t>(source_index(c0 + c, scale_x, source.width()));
+            column_offset[c] = x * kBitmapBytesPerPixel;
+            doubled = doubled && x == static_cast<uint64_t>(c0 + c) / 2;
+            halved = halved && x == static_cast<uint64_t>(c0 + c) * 2 + 1;
         }
+        int32_t previous = -1;
         for (int32_t r = 0; r < target.height(); ++r) {
-            const uint8_t* src = source.row(source_index(r, scale_y, source.height()));
             uint8_t* dst = target.row(r) + c0 * kBitmapBytesPerPixel;
-            for (int64_t c = 0; c < count; ++c) {
-                memcpy(dst + c * kBitmapBytesPerPixel, src + column_offset[c], kBitmapBytesPerPixel);
+            const int32_t y = source_index(r, scale_y, source.height());
+            // Rows showing the same source row as the one above are copies.
+            if (y == previous) {
+                memcpy(dst, dst - target.row_bytes(), static_cast<size_t>(count) * kBitmapBytesPerPixel);
+                continue;
             }
+            previous = y;
+            const uint8_t* src = source.row(y);
+            int64_t done = 0;
+            if (doubled) {
+                done = count & ~int64_t{1};
+                double_run(dst, src + c0 / 2 * kBitmapBytesPerPixel, done / 2);
+            } else if (halved) {
+                done = count;
+                halve_run(dst, src + c0 * 2 * kBitmapBytesPerPixel, count);
+            }
+            gather_run(dst, src, column_offset, done, count);
         }
     }
 }

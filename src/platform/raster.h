@@ -70,6 +70,13 @@ private:
 // unchanged, when it has no pixels or that memory cannot be had.
 bool turn_in_place(Bitmap& bitmap, int quarter_turns, int32_t pivot_x, int32_t pivot_y);
 
+// Draws the turn of a width x height block of pixels, rows src_row_bytes
+// apart, clockwise by quarter_turns x 90 degrees about its centre into dst,
+// rows dst_row_bytes apart: height wide and width high after an odd number
+// of turns. Every target pixel is covered. The blocks must not overlap.
+void turn_copy(const uint8_t* src, size_t src_row_bytes, int32_t width, int32_t height, int quarter_turns,
+               uint8_t* dst, size_t dst_row_bytes);
+
 // Draws `source` scaled by the factors over the whole target: target pixel
 // (c, r) takes the source pixel under its centre mapped back,
 // ((c + 0.5) / scale_x, (r + 0.5) / scale_y), clamped into the source.

@@ -3,6 +3,7 @@
 #include <stdint.h>
 #include <string.h>
 
+#include <random>
 #include <string>
 #include <vector>
 
@@ -57,21 +58,47 @@ TEST(Rotate, EveryAngleMapsEveryPixel) {
 }
 
 // Other formats turn through RGBA: exactly converting, turning the RGBA copy
-// and converting back into the same buffer.
+// and converting back into the same buffer. 4:2:0 images get those bytes
+// tile by tile: sizes of one tile, several (64 pixels a side) and not a
+// multiple of it, chroma right after the luma or further on in a larger
+// buffer (bytes in between untouched), every angle, 0 included (a round trip).
 TEST(Rotate, OtherFormatsThroughRgba) {
-    ImagePtr nv21 = distinct_image(16, 8, QK_FORMAT_NV21), expected(QKImage_clone(nv21.get()));
-    ImagePtr rgba(QKImage_copyAndConvert(nv21.get(), QK_FORMAT_RGBA));
-    ASSERT_EQ(QKImage_rotate(rgba.get(), 270) | QKImage_convert(rgba.get(), expected.get()), QK_OK);
-    ASSERT_EQ(QKImage_rotate(nv21.get(), 270), QK_OK);
-    EXPECT_EQ(std::make_tuple(nv21->format, nv21->width, nv21->height), std::make_tuple(QK_FORMAT_NV21, 8, 16));
-    EXPECT_EQ(memcmp(nv21->data, expected->data, 192), 0);
+    const struct { uint32_t format; int32_t w, h; uint32_t gap; } cases[] = {
+        {QK_FORMAT_NV21, 16, 8, 0},   {QK_FORMAT_NV12, 130, 66, 0},  {QK_FORMAT_YV12, 64, 192, 0},
+        {QK_FORMAT_YUVP, 6, 258, 0},  {QK_FORMAT_NV12, 2, 2, 0},     {QK_FORMAT_NV21, 200, 130, 40},
+        {QK_FORMAT_YV12, 34, 12, 6},  {QK_FORMAT_YUVP, 128, 66, 64}, {QK_FORMAT_YUYV, 6, 4, 0},
+    };
+    std::mt19937 random(7);
+    for (const auto& c : cases) {
+        for (int32_t angle : {0, 90, 180, 270, -90}) {
+            SCOPED_TRACE(::testing::Message() << fourcc(c.format) << " " << c.w << "x" << c.h << " gap " << c.gap
+                                              << " by " << angle);
+            const size_t luma = size_t(c.w) * c.h, bytes = QKImage_requiredSize(c.w, c.h, c.format) + c.gap;
+            const uint32_t chroma = c.gap != 0 ? uint32_t(luma + c.gap) : 0;
+            Frame image({c.format, c.w, c.h, bytes, bytes, chroma}), expected({c.format, c.w, c.h, bytes, bytes, chroma});
+            image.randomize(random);
+            expected.buffer = image.buffer;
+            ImagePtr rgba(QKImage_copyAndConvert(&image.image, QK_FORMAT_RGBA));
+            ASSERT_EQ(QKImage_rotate(rgba.get(), angle) | QKImage_convert(rgba.get(), &expected.image), QK_OK);
+            ASSERT_EQ(QKImage_rotate(&image.image, angle), QK_OK);
+            EXPECT_EQ(std::make_tuple(image.image.width, image.image.height),
+                      std::make_tuple(expected.image.width, expected.image.height));
+            EXPECT_TRUE(image.buffer == expected.buffer);
+        }
+    }
 }
 
 // Each output pixel copies the source pixel under its centre, worked out by
 // hand. A destination without buffer gets one; one sharing the source's
 // buffer gets what a separate one gets, nothing of its old content left.
 TEST(Scale, NearestPixelUnderTheCentre) {
+    // Exact doubling and halving, wide enough for whole vectors and tails
+    // (and, at 4200 columns, two strips of the column table).
+    auto doubled = [](int n) { std::vector<int> v; for (int i = 0; i < n; ++i) v.push_back(i / 2); return v; };
+    auto halved = [](int n) { std::vector<int> v; for (int i = 0; i < n; ++i) v.push_back(2 * i + 1); return v; };
     const struct { int32_t sw, sh, dw, dh; std::vector<int> cols, rows; } cases[] = {
+        {9, 3, 18, 6, doubled(18), doubled(6)}, {22, 6, 11, 3, halved(11), halved(3)},
+        {2100, 2, 4200, 4, doubled(4200), doubled(4)}, {8400, 2, 4200, 1, halved(4200), halved(1)},
         {3, 3, 3, 3, {0, 1, 2}, {0, 1, 2}},        // equal sizes: a copy
         {4, 4, 2, 2, {1, 3}, {1, 3}},              // one pixel of each 2x2 block, no averaging
         {2, 2, 4, 4, {0, 0, 1, 1}, {0, 0, 1, 1}},  // each pixel repeated in a 2x2 block
@@ -223,6 +250,8 @@ TEST(GeometryRefusals, ReportOnceAndLeaveTheImagesAlone) {
         // Other formats turn through RGBA: conversion refusals come back.
         {kRotate, {QK_FORMAT_D16, 4, 2}, {}, 90, 0, NONE, kConvertFile, "[QKImage] Can not convert  D16 into RGBA"},
         {kRotate, {QK_FORMAT_YUYV, 4, 3}, {}, 90, 0, SIZE, kConvertFile},  // turned 3 pixels wide
+        // 4:2:0 turns itself, refusing what those conversions refuse.
+        {kRotate, {NV21, 4, 3}, {}, 90, 0, SIZE}, {kRotate, {NV12, 4, 2, 0, kBuffer, 60}, {}, 90, 0, SIZE},
 
         {kScale, null, rgba2, 0, 0, NUL}, {kScale, rgba2, null, 0, 0, NUL}, {kScale, none2, rgba2, 0, 0, NUL},
         {kScale, {RGBA, 0, 2, 64}, none2, 0, 0, SIZE, nullptr, kScaleSizes},
