@@ -3,15 +3,95 @@
 // CPU support it. So nothing here may be an inline function that baseline
 // code could share (the linker might keep this file's copy): kernels live in
 // an anonymous namespace and reach shared code through out-of-line calls.
+//
+// The kernels themselves are in row_x86_kernels.inc, shared with
+// row_ssse3.cpp; this file gives them two 128-bit lanes.
 #include <immintrin.h>
+#include <stddef.h>
+#include <stdint.h>
+#include <string.h>
+
+#include <utility>
 
 #include "convert/row.h"
+
+// The helpers of the kernels: always inlined, so that vectors stay in
+// registers and constants are loaded once per row.
+#define QK_SIMD [[gnu::always_inline]] inline
 
 namespace qk {
 namespace {
 
+// Two 128-bit lanes, each converting its own block of 16 pixels as
+// row_ssse3.cpp does: every load and store names the distance `lane` from
+// the first lane's bytes to the second's, and the in-lane operations of
+// AVX2 (byte shuffles, packs, unpacks) then need no lane crossing.
+using V = __m256i;
+constexpr int kLanes = 2;
+
+QK_SIMD V load(const uint8_t* p, ptrdiff_t lane) {
+    return _mm256_inserti128_si256(_mm256_castsi128_si256(_mm_loadu_si128(reinterpret_cast<const __m128i*>(p))),
+                                   _mm_loadu_si128(reinterpret_cast<const __m128i*>(p + lane)), 1);
+}
+QK_SIMD void store(uint8_t* p, ptrdiff_t lane, V value) {
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(p), _mm256_castsi256_si128(value));
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(p + lane), _mm256_extracti128_si256(value, 1));
+}
+// 8 bytes into the low half of each lane.
+QK_SIMD V load_half(const uint8_t* p, ptrdiff_t lane) {
+    return _mm256_inserti128_si256(_mm256_castsi128_si256(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p))),
+                                   _mm_loadl_epi64(reinterpret_cast<const __m128i*>(p + lane)), 1);
+}
+QK_SIMD V v_broadcast(const int8_t* bytes) {
+    return _mm256_broadcastsi128_si256(_mm_loadu_si128(reinterpret_cast<const __m128i*>(bytes)));
+}
+QK_SIMD V v_and(V a, V b) { return _mm256_and_si256(a, b); }
+QK_SIMD V v_or(V a, V b) { return _mm256_or_si256(a, b); }
+QK_SIMD V v_setzero() { return _mm256_setzero_si256(); }
+template <int N>
+QK_SIMD V v_alignr(V high, V low) {
+    return _mm256_alignr_epi8(high, low, N);
+}
+template <int N>
+QK_SIMD V v_shift_right_bytes(V a) {
+    return _mm256_srli_si256(a, N);
+}
+template <int N>
+QK_SIMD V v_shift_left_bytes(V a) {
+    return _mm256_slli_si256(a, N);
+}
+
+#define v_add_epi16 _mm256_add_epi16
+#define v_add_epi32 _mm256_add_epi32
+#define v_cmpeq_epi8 _mm256_cmpeq_epi8
+#define v_madd_epi16 _mm256_madd_epi16
+#define v_movemask_epi8 _mm256_movemask_epi8
+#define v_mul_epu32 _mm256_mul_epu32
+#define v_mulhi_epi16 _mm256_mulhi_epi16
+#define v_packs_epi32 _mm256_packs_epi32
+#define v_packus_epi16 _mm256_packus_epi16
+#define v_set1_epi16 _mm256_set1_epi16
+#define v_set1_epi32 _mm256_set1_epi32
+#define v_set1_epi8 _mm256_set1_epi8
+#define v_shuffle_epi8 _mm256_shuffle_epi8
+#define v_slli_epi32 _mm256_slli_epi32
+#define v_slli_epi64 _mm256_slli_epi64
+#define v_srai_epi32 _mm256_srai_epi32
+#define v_srli_epi16 _mm256_srli_epi16
+#define v_srli_epi32 _mm256_srli_epi32
+#define v_srli_epi64 _mm256_srli_epi64
+#define v_sub_epi16 _mm256_sub_epi16
+#define v_sub_epi32 _mm256_sub_epi32
+#define v_unpackhi_epi16 _mm256_unpackhi_epi16
+#define v_unpackhi_epi8 _mm256_unpackhi_epi8
+#define v_unpacklo_epi16 _mm256_unpacklo_epi16
+#define v_unpacklo_epi8 _mm256_unpacklo_epi8
+
+#include "convert/x86/row_x86_kernels.inc"
+
 }  // namespace
 
-const RowKernelSet kAvx2Rows = {"avx2", nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr};
+const RowKernelSet kAvx2Rows = {"avx2",          simd_rgb_to_rgb,  simd_rgb_to_luma, simd_rgb_to_chroma,
+                                simd_yuv_to_rgb, simd_grey_to_rgb, simd_sample,      simd_chroma};
 
 }  // namespace qk
