@@ -86,9 +86,9 @@ inline bool chroma_together(const uint8_t* u, const uint8_t* v) {
     }
 }
 
-// Samples a step-4 block reads or writes past its last V (the luma byte
-// after it), and a step-2 luma block past its last sample: such blocks need
-// one more sample of the row after them.
+// A step-4 chroma block spans 64 bytes from its first chroma byte, one past
+// its last: it is taken only where one more sample of the row follows.
+// (Step-2 luma blocks, likewise, in the luma kernels.)
 template <int Step>
 constexpr int overreach() {
     return Step == 4 ? 1 : 0;
