@@ -108,25 +108,37 @@ inline void gather_run(uint8_t* dst, const uint8_t* src, const uint32_t* offset,
     }
 }
 
-// Each of `count` source pixels twice.
-inline void double_run(uint8_t* dst, const uint8_t* src, int64_t count) {
+// Each of `count` source pixels twice, into dst and, when not null, into
+// twin as well (the row below showing the same source row: written from the
+// same loads rather than copied back from the row just written).
+inline void double_run(uint8_t* dst, uint8_t* twin, const uint8_t* src, int64_t count) {
     int64_t i = 0;
 #if defined(__SSE2__)
     for (; i + 4 <= count; i += 4) {
         const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(src + i * kBitmapBytesPerPixel));
-        _mm_storeu_si128(reinterpret_cast<__m128i*>(dst + 2 * i * kBitmapBytesPerPixel), _mm_unpacklo_epi32(v, v));
-        _mm_storeu_si128(reinterpret_cast<__m128i*>(dst + (2 * i + 4) * kBitmapBytesPerPixel),
-                         _mm_unpackhi_epi32(v, v));
+        const __m128i low = _mm_unpacklo_epi32(v, v), high = _mm_unpackhi_epi32(v, v);
+        const size_t at = static_cast<size_t>(2 * i * kBitmapBytesPerPixel);
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(dst + at), low);
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(dst + at + 16), high);
+        if (twin != nullptr) {
+            _mm_storeu_si128(reinterpret_cast<__m128i*>(twin + at), low);
+            _mm_storeu_si128(reinterpret_cast<__m128i*>(twin + at + 16), high);
+        }
     }
 #elif defined(__ARM_NEON)
     for (; i + 4 <= count; i += 4) {
         const uint32x4_t v = vld1q_u32(reinterpret_cast<const uint32_t*>(src + i * kBitmapBytesPerPixel));
-        vst2q_u32(reinterpret_cast<uint32_t*>(dst + 2 * i * kBitmapBytesPerPixel), uint32x4x2_t{{v, v}});
+        const size_t at = static_cast<size_t>(2 * i * kBitmapBytesPerPixel);
+        vst2q_u32(reinterpret_cast<uint32_t*>(dst + at), uint32x4x2_t{{v, v}});
+        if (twin != nullptr) vst2q_u32(reinterpret_cast<uint32_t*>(twin + at), uint32x4x2_t{{v, v}});
     }
 #endif
     for (; i < count; ++i) {
-        memcpy(dst + 2 * i * kBitmapBytesPerPixel, src + i * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
-        memcpy(dst + (2 * i + 1) * kBitmapBytesPerPixel, src + i * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
+        for (uint8_t* row : {dst, twin}) {
+            if (row == nullptr) continue;
+            memcpy(row + 2 * i * kBitmapBytesPerPixel, src + i * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
+            memcpy(row + (2 * i + 1) * kBitmapBytesPerPixel, src + i * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
+        }
     }
 }
 
@@ -420,23 +432,52 @@ void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& tar
         if (!(mapped >= 0)) return 0;
         return mapped >= static_cast<float>(limit) ? limit - 1 : static_cast<int32_t>(mapped);
     };
+    const int64_t width = target.width();
+    const size_t row_bytes = target.row_bytes();
 
-    // Source byte offsets of the target columns, computed once per call; in
-    // strips of columns so that the table lives on the stack (one strip for
-    // targets up to kStrip pixels wide).
+    // Exact doubling (column c shows c / 2) and halving (2c + 1) move whole
+    // vectors along whole rows, without a column table.
+    bool doubled = true, halved = true;
+    for (int64_t c = 0; c < width && (doubled || halved); ++c) {
+        const int64_t x = source_index(c, scale_x, source.width());
+        doubled = doubled && x == c / 2;
+        halved = halved && x == 2 * c + 1;
+    }
+    if (doubled || halved) {
+        for (int32_t r = 0; r < target.height();) {
+            const int32_t y = source_index(r, scale_y, source.height());
+            // Target rows showing the same source row.
+            int32_t same = 1;
+            while (r + same < target.height() && source_index(r + same, scale_y, source.height()) == y) ++same;
+            uint8_t* dst = target.row(r);
+            int32_t done = 1;
+            if (doubled) {
+                done = same >= 2 ? 2 : 1;
+                double_run(dst, same >= 2 ? dst + row_bytes : nullptr, source.row(y), width / 2);
+                // An odd width ends on a pixel of its own, doubled too.
+                for (int32_t k = 0; width % 2 != 0 && k < done; ++k) {
+                    memcpy(dst + k * row_bytes + (width - 1) * kBitmapBytesPerPixel,
+                           source.row(y) + (width - 1) / 2 * kBitmapBytesPerPixel, kBitmapBytesPerPixel);
+                }
+            } else {
+                halve_run(dst, source.row(y), width);
+            }
+            for (int32_t k = done; k < same; ++k) memcpy(dst + k * row_bytes, dst, row_bytes);
+            r += same;
+        }
+        return;
+    }
+
+    // Otherwise source byte offsets of the target columns, computed once per
+    // call; in strips of columns so that the table lives on the stack (one
+    // strip for targets up to kStrip pixels wide).
     constexpr int64_t kStrip = 4096;
     uint32_t column_offset[kStrip];
-    const int64_t width = target.width();
     for (int64_t c0 = 0; c0 < width; c0 += kStrip) {
         const int64_t count = std::min(kStrip, width - c0);
-        // Exact doubling (column c shows c / 2) and halving (2c + 1) are
-        // worth spotting: they move whole vectors instead of gathering.
-        bool doubled = true, halved = true;
         for (int64_t c = 0; c < count; ++c) {
-            const uint32_t x = static_cast<uint32_t>(source_index(c0 + c, scale_x, source.width()));
-            column_offset[c] = x * kBitmapBytesPerPixel;
-            doubled = doubled && x == static_cast<uint64_t>(c0 + c) / 2;
-            halved = halved && x == static_cast<uint64_t>(c0 + c) * 2 + 1;
+            column_offset[c] =
+                static_cast<uint32_t>(source_index(c0 + c, scale_x, source.width())) * kBitmapBytesPerPixel;
         }
         int32_t previous = -1;
         for (int32_t r = 0; r < target.height(); ++r) {
@@ -444,20 +485,11 @@ void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& tar
             const int32_t y = source_index(r, scale_y, source.height());
             // Rows showing the same source row as the one above are copies.
             if (y == previous) {
-                memcpy(dst, dst - target.row_bytes(), static_cast<size_t>(count) * kBitmapBytesPerPixel);
+                memcpy(dst, dst - row_bytes, static_cast<size_t>(count) * kBitmapBytesPerPixel);
                 continue;
             }
             previous = y;
-            const uint8_t* src = source.row(y);
-            int64_t done = 0;
-            if (doubled) {
-                done = count & ~int64_t{1};
-                double_run(dst, src + c0 / 2 * kBitmapBytesPerPixel, done / 2);
-            } else if (halved) {
-                done = count;
-                halve_run(dst, src + c0 * 2 * kBitmapBytesPerPixel, count);
-            }
-            gather_run(dst, src, column_offset, done, count);
+            gather_run(dst, source.row(y), column_offset, 0, count);
         }
     }
 }
