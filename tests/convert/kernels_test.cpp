@@ -191,6 +191,19 @@ TEST(RowVariants, EveryVariantWritesExactlyTheBytesOfItsReferenceWithinItsRows) 
     signal(SIGSEGV, SIG_DFL);
 }
 
+// The best set this CPU supports answers first; turned off, only the
+// portable set does.
+TEST(RowSelection, SimdSetsComeFirstUnlessTurnedOff) {
+    const int s = rgb_format_index(QK_FORMAT_RGBA), d = rgb_format_index(QK_FORMAT_BGRA);
+    const SupportedRowSets& supported = supported_row_sets();
+    const RgbToRgbRow best = supported.count > 0 && supported.sets[0]->rgbToRgb ? supported.sets[0]->rgbToRgb(s, d)
+                                                                                  : nullptr;
+    EXPECT_EQ(select_rgb_to_rgb_row(s, d), best != nullptr ? best : kPortableRows.rgbToRgb(s, d));
+    set_simd_enabled(false);
+    EXPECT_EQ(select_rgb_to_rgb_row(s, d), kPortableRows.rgbToRgb(s, d));
+    set_simd_enabled(true);
+}
+
 // For every kernel set, on a 3-byte and a 4-byte layout.
 TEST(Exhaustive, RgbToYuvGivesTheFormulaForEveryColour) {
     // One row per red value holding every (green, blue) at an even pixel, the
