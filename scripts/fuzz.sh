@@ -38,7 +38,7 @@ cmake --build build/fuzz -j 2 --target "${selected[@]/#/fuzz_}"
 # Inputs only need to be as long as the parameters a target reads; pictures
 # are kept short so that each run stays fast. The malloc limit stops any
 # single allocation far beyond what these inputs justify (images of at most
-# 1 MB, decoded pictures of at most 16 MB).
+# 128 KB, decoded pictures of at most 16 MB).
 max_len() {
   case "$1" in
     options) echo 512 ;;

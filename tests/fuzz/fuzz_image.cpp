@@ -80,9 +80,9 @@ bool expected_conversion(const QKImage& src, size_t srcLength, const QKImage& ds
         return true;
     }
     // Same format: one block of the recorded size when both images record
-    // the same size and keep their chroma in the same place, else the
+    // the same size (and 4:2:0 ones the same chroma offset), else the
     // picture: 4:2:0 luma and chroma each from where its image keeps it.
-    if (dst.size != 0 && dst.size == src.size && dst.chromaOffset == src.chromaOffset) {
+    if (dst.size != 0 && dst.size == src.size && (!is_yuv420(src.format) || dst.chromaOffset == src.chromaOffset)) {
         if (dst.size > srcLength || dst.size > capacity) return false;
         std::copy_n(src.data, dst.size, out->begin());
         return true;
@@ -183,11 +183,10 @@ void clone(Frame& frame) {
     // the luma.
     const uint64_t available = source->size != 0 ? std::min<uint64_t>(source->size, frame.length()) : frame.length();
     auto part = [&](uint64_t to, uint64_t from, uint64_t length) {
-        bool same = true;
-        for (uint64_t i = 0; i < length; ++i) {
-            same &= copy->data[to + i] == (from + i < available ? source->data[from + i] : 0);
-        }
-        return same;
+        const uint64_t present = from < available ? std::min(length, available - from) : 0;
+        const std::vector<uint8_t> zeros(length - present + 1);
+        return (present == 0 || memcmp(copy->data + to, source->data + from, present) == 0) &&
+               memcmp(copy->data + to + present, zeros.data(), length - present) == 0;
     };
     bool same;
     if (is_yuv420(source->format) && source->chromaOffset != 0) {

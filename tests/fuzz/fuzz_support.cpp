@@ -6,6 +6,8 @@
 #include <stdlib.h>
 #include <string.h>
 
+#include <algorithm>
+
 #include "qkcore/qk_log.h"
 
 namespace qkfuzz {
@@ -128,10 +130,11 @@ uint64_t claimed_bytes(int32_t width, int32_t height, uint32_t format, uint64_t 
 }
 
 void fill(uint8_t* data, size_t bytes, uint8_t seed) {
-    uint32_t state = 0x9E3779B9u ^ (seed * 0x01000193u);
-    for (size_t i = 0; i < bytes; ++i) {
-        state ^= state << 13, state ^= state >> 17, state ^= state << 5;
-        data[i] = static_cast<uint8_t>(state >> 24);
+    // Eight bytes a step: this runs over every buffer of every input.
+    uint64_t state = 0x9E3779B97F4A7C15u ^ (seed * 0x100000001B3u);
+    for (size_t i = 0; i < bytes; i += sizeof(state)) {
+        state ^= state << 13, state ^= state >> 7, state ^= state << 17;
+        memcpy(data + i, &state, std::min(sizeof(state), bytes - i));
     }
 }
 
@@ -252,7 +255,7 @@ bool Snapshot::operator==(const Snapshot& other) const {
            bytes == other.bytes;
 }
 
-void check_decoded(const Frame& frame, const Snapshot& before, int32_t status) {
+void check_decoded(const Frame& frame, const Snapshot& before, int32_t status, bool decoded) {
     const QKImage* image = frame.image;
     if (status != QK_OK) {
         if (before.data != nullptr && before.isWrapped != 0) {
@@ -267,7 +270,7 @@ void check_decoded(const Frame& frame, const Snapshot& before, int32_t status) {
     check(image->data != nullptr && image->width > 0 && image->height > 0, "a decoded image without picture");
     const uint64_t claimed = QKImage_size(image);
     const uint64_t rule = rule_bytes(image->width, image->height, image->format);
-    check(rule == 0 || claimed >= rule, "a decoded image records less than its picture");
+    check(!decoded || rule == 0 || claimed >= rule, "a decoded image records less than its picture");
     // The caller's buffer has the bytes the target gave it; any other is the
     // library's, from malloc.
     const uint64_t holds = image->data == before.data && before.isWrapped != 0 ? before.bytes.size()

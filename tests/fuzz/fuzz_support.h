@@ -69,7 +69,7 @@ constexpr int32_t kHugeOffsets[8] = {INT32_MIN, INT32_MAX, 100000, -100000, 1 <<
 
 // The largest buffer a target makes or lets the library make, so that
 // fuzzing stays small whatever the dimensions.
-constexpr uint64_t kMaxBytes = 1 << 20;
+constexpr uint64_t kMaxBytes = 1 << 17;
 
 // The size rule of qk_image.h in 128-bit arithmetic: bytes of a w x h
 // buffer, 0 for a dimension below 1, a format without rule, or a size past
@@ -146,10 +146,12 @@ struct Snapshot {
 
 // What a decoding call (from memory or a file) must leave, `before` being
 // the image as it was: a failure never frees or drops the caller's buffer,
-// and one refused as too small keeps its bytes; a success leaves a picture
+// and one refused as too small keeps its bytes; a success leaves an image
 // whose size its buffer really holds (every claimed byte is read, so that
-// AddressSanitizer sees a claim past the buffer).
-void check_decoded(const Frame& frame, const Snapshot& before, int32_t status);
+// AddressSanitizer sees a claim past the buffer) and, when `decoded` (a
+// success can only be a picture), a size that holds the picture. A file
+// loaded as raw pixels keeps the size the image recorded, short or not.
+void check_decoded(const Frame& frame, const Snapshot& before, int32_t status, bool decoded);
 
 // Offsets in the buffer of the bytes of pixel (x, y) of a packed RGB or
 // 4:2:0 image: its own bytes, or its Y, U and V samples.
