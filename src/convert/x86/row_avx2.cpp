@@ -27,6 +27,7 @@ namespace {
 // the first lane's bytes to the second's, and the in-lane operations of
 // AVX2 (byte shuffles, packs, unpacks) then need no lane crossing.
 using V = __m256i;
+using F = __m256;  // single precision
 constexpr int kLanes = 2;
 
 QK_SIMD V load(const uint8_t* p, ptrdiff_t lane) {
@@ -61,6 +62,11 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm256_slli_si256(a, N);
 }
 
+#define v_add_ps _mm256_add_ps
+#define v_mul_ps _mm256_mul_ps
+#define v_set1_ps _mm256_set1_ps
+#define v_cvtepi32_ps _mm256_cvtepi32_ps
+#define v_cvttps_epi32 _mm256_cvttps_epi32
 #define v_add_epi16 _mm256_add_epi16
 #define v_add_epi32 _mm256_add_epi32
 #define v_cmpeq_epi8 _mm256_cmpeq_epi8

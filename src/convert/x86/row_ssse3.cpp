@@ -25,6 +25,7 @@ namespace {
 // One 128-bit lane: a block of 16 pixels a step. The kernels name their
 // operations v_*, which row_avx2.cpp maps to two lanes.
 using V = __m128i;
+using F = __m128;  // single precision
 constexpr int kLanes = 1;
 
 QK_SIMD V load(const uint8_t* p, ptrdiff_t) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
@@ -48,6 +49,11 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm_slli_si128(a, N);
 }
 
+#define v_add_ps _mm_add_ps
+#define v_mul_ps _mm_mul_ps
+#define v_set1_ps _mm_set1_ps
+#define v_cvtepi32_ps _mm_cvtepi32_ps
+#define v_cvttps_epi32 _mm_cvttps_epi32
 #define v_add_epi16 _mm_add_epi16
 #define v_add_epi32 _mm_add_epi32
 #define v_cmpeq_epi8 _mm_cmpeq_epi8
