@@ -129,8 +129,11 @@ inline void double_run(uint8_t* dst, uint8_t* twin, const uint8_t* src, int64_t 
     for (; i + 4 <= count; i += 4) {
         const uint32x4_t v = vld1q_u32(reinterpret_cast<const uint32_t*>(src + i * kBitmapBytesPerPixel));
         const size_t at = static_cast<size_t>(2 * i * kBitmapBytesPerPixel);
-        vst2q_u32(reinterpret_cast<uint32_t*>(dst + at), uint32x4x2_t{{v, v}});
-        if (twin != nullptr) vst2q_u32(reinterpret_cast<uint32_t*>(twin + at), uint32x4x2_t{{v, v}});
+        // A named pair: clang's intrinsics are macros, where a braced list's
+        // comma would split the argument.
+        const uint32x4x2_t pair = {{v, v}};
+        vst2q_u32(reinterpret_cast<uint32_t*>(dst + at), pair);
+        if (twin != nullptr) vst2q_u32(reinterpret_cast<uint32_t*>(twin + at), pair);
     }
 #endif
     for (; i < count; ++i) {
