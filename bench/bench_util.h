@@ -10,8 +10,11 @@
 #include <stdlib.h>
 #include <string.h>
 
+#include <algorithm>
+#include <memory>
 #include <random>
 #include <string>
+#include <vector>
 
 #include "image/format.h"
 #include "qkcore/qk_image.h"
@@ -62,7 +65,10 @@ public:
         memset(data_, 0, bytes_);
         if (noise) {
             std::mt19937 random(11);
-            for (uint64_t i = 0; i < bytes_; ++i) data_[i] = static_cast<uint8_t>(random());
+            for (uint64_t i = 0; i < bytes_; i += 4) {
+                const uint32_t word = random();
+                memcpy(data_ + i, &word, std::min<uint64_t>(4, bytes_ - i));
+            }
             const qk::FormatInfo* info = qk::find_format(format);
             if (info != nullptr && info->family == qk::FormatFamily::kRgb && info->rgb.aOffset >= 0) {
                 for (uint64_t i = info->rgb.aOffset; i < bytes_; i += 4) data_[i] = 255;
@@ -85,6 +91,30 @@ private:
     uint64_t bytes_;
     uint8_t* data_;
     QKImage* image_ = nullptr;
+};
+
+// The source and destination frames of a benchmark that makes one call per
+// frame: as many pairs as fill 64 MiB (twice this machine's last-level
+// cache), taken in turn, so that each call meets its frames cold, as it does
+// a camera's, never left in the caches by the call before.
+class FrameRing {
+public:
+    FrameRing(int32_t width, int32_t height, uint32_t from, int32_t out_width, int32_t out_height, uint32_t to) {
+        constexpr uint64_t kColdBytes = uint64_t{64} << 20;
+        const uint64_t pair = QKImage_requiredSize(width, height, from) + QKImage_requiredSize(out_width, out_height, to);
+        for (uint64_t filled = 0; filled < kColdBytes; filled += pair) {
+            sources_.push_back(std::make_unique<CallerFrame>(width, height, from, /*noise=*/true));
+            targets_.push_back(std::make_unique<CallerFrame>(out_width, out_height, to, /*noise=*/false));
+        }
+    }
+
+    CallerFrame& source() const { return *sources_[next_]; }
+    CallerFrame& target() const { return *targets_[next_]; }
+    void advance() { next_ = (next_ + 1) % sources_.size(); }
+
+private:
+    std::vector<std::unique_ptr<CallerFrame>> sources_, targets_;
+    size_t next_ = 0;
 };
 
 // Silences the library's messages for the scope.

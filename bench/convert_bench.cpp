@@ -11,20 +11,23 @@ namespace {
 
 using namespace qkbench;
 
-// The caller's frames (CallerFrame), and rates per second of wall-clock
-// time: what a caller timing its own calls sees on the same machine.
+// The caller's frames, cold (FrameRing), and rates per second of wall-clock
+// time: what a caller timing its own calls on camera frames sees on the same
+// machine.
 void BM_Convert(benchmark::State& state, uint32_t from, uint32_t to) {
     const int32_t width = static_cast<int32_t>(state.range(0));
     const int32_t height = static_cast<int32_t>(state.range(1));
     QuietLog quiet;  // the start line of every call is not what we measure
-    CallerFrame src(width, height, from, /*noise=*/true);
-    CallerFrame dst(width, height, to, /*noise=*/false);
+    FrameRing frames(width, height, from, width, height, to);
     for (auto _ : state) {
-        if (QKImage_convert(src.image(), dst.image()) != QK_OK) state.SkipWithError("conversion failed");
-        benchmark::DoNotOptimize(dst.data());
+        if (QKImage_convert(frames.source().image(), frames.target().image()) != QK_OK) {
+            state.SkipWithError("conversion failed");
+        }
+        benchmark::DoNotOptimize(frames.target().data());
         benchmark::ClobberMemory();
+        frames.advance();
     }
-    set_rates(state, int64_t{width} * height, dst.size());
+    set_rates(state, int64_t{width} * height, frames.target().size());
 }
 
 // Named after the formats: "BM_Convert/nv21_to_rgba", "BM_Convert/copy_nv21".

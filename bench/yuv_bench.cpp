@@ -1,8 +1,9 @@
 // Our conversions, quarter turns and scaling beside libyuv's, the yardstick,
 // on the same frames at 1920x1080 and 4000x3000: "BM_Yuv/<operation>/ours/W/H"
 // next to "BM_Yuv/<operation>/libyuv/W/H". Both sides run single-threaded on
-// the caller's plain malloc'ed buffers (CallerFrame), ours wrapped and
-// reached through the exported functions, nothing allocated per call. Rates
+// the caller's plain malloc'ed buffers, cold as a camera's (FrameRing), ours
+// wrapped and reached through the exported functions, nothing allocated per
+// call. Rates
 // are per second of CPU time, which other work on a shared machine disturbs
 // less than the wall-clock rates of BM_Convert. libyuv works in limited
 // range and rounds its own way: compare speed only. bench/ratios.sh prints
@@ -144,9 +145,10 @@ void BM_Yuv(benchmark::State& state, const Operation& op, bool ours) {
     const int32_t out_width = width * op.scale_num / op.scale_den;
     const int32_t out_height = height * op.scale_num / op.scale_den;
     QuietLog quiet;  // the start line of every call is not what we measure
-    CallerFrame source(width, height, op.from, /*noise=*/true);
-    CallerFrame target(out_width, out_height, op.to, /*noise=*/false);
+    FrameRing frames(width, height, op.from, out_width, out_height, op.to);
     for (auto _ : state) {
+        CallerFrame& source = frames.source();
+        CallerFrame& target = frames.target();
         const int result = ours ? run_ours(op, source.image(), target.image())
                                 : op.libyuv(source.data(), width, height, target.data(), out_width, out_height);
         if (result != 0) {
@@ -156,6 +158,7 @@ void BM_Yuv(benchmark::State& state, const Operation& op, bool ours) {
         benchmark::DoNotOptimize(target.data());
         benchmark::DoNotOptimize(source.data());
         benchmark::ClobberMemory();
+        frames.advance();
     }
     set_rates(state, op.kind == Kind::kScale ? int64_t{out_width} * out_height : int64_t{width} * height);
 }
