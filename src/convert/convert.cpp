@@ -32,7 +32,11 @@ void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copy_length) {
         const uint64_t chroma_bytes = qk::yuv420_chroma_bytes(src.width, src.height);
         const uint64_t src_base = qk::chroma_base(src);
         const uint64_t dst_base = qk::chroma_base(dst);
-        if (src.chromaOffset != dst.chromaOffset || copy_length < dst_base + chroma_bytes) {
+        // One block only where it holds both planes and stays inside what
+        // the source claims: chroma placed inside the luma plane makes a
+        // picture shorter than the size rule.
+        if (src.chromaOffset != dst.chromaOffset || copy_length < dst_base + chroma_bytes ||
+            copy_length > QKImage_size(&src)) {
             memmove(dst.data, src.data, luma_bytes);
             memmove(dst.data + dst_base, src.data + src_base, chroma_bytes);
             return;

@@ -92,6 +92,8 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
         {{NV12, 16, 8, 400, 400}, {NV12, 16, 8, 400, 400}, {{0, 0, 400}, {}}},
         {{NV12, 16, 8, 400, 400}, {NV12, 16, 8, 400, 400, 128}, {{0, 0, 128}, {128, 128, 64}}},
         {{YV12, 16, 8, 364, 0, 300}, {YV12, 16, 8, 370, 370, 300}, {{0, 0, 128}, {300, 300, 64}}},
+        // Chroma inside the luma plane: the source holds 128 bytes, not the rule's 192.
+        {{NV12, 16, 8, 128, 128, 32}, {NV12, 16, 8, 200, 0, 32}, {{0, 0, 128}, {32, 32, 64}}},
     };
     std::mt19937 random(7);
     for (const auto& c : cases) {
