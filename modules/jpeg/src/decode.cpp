@@ -6,6 +6,7 @@
 
 #include "image/format.h"
 #include "planes.h"
+#include "platform/memory.h"
 #include "qkcore/qk_image.h"
 #include "turbo.h"
 #include "veljpeginterface.h"
@@ -79,7 +80,9 @@ extern "C" __attribute__((visibility("default"))) void* fastJpegDecode(const voi
     // Too large a picture is refused on its header, before any allocation.
     const uint64_t bytes = QKImage_requiredSize(w, h, format);
     if (bytes == 0) return nullptr;
-    Block out = qk::jpeg::allocate(bytes);
+    // The library's pixel memory: frame-sized blocks are mapped in with one
+    // system call rather than a page fault at a time while decoding.
+    Block out(static_cast<uint8_t*>(qk::platform::allocate_pixels(bytes)));
     if (!out) return nullptr;
 
     const bool decoded = yuv420 ? decode_420(handle.get(), stream, size, w, h, format, out.get(), bytes)
