@@ -6,6 +6,7 @@
 
 #include "image/format.h"
 #include "planes.h"
+#include "platform/memory.h"
 #include "qkcore/qk_image.h"
 #include "turbo.h"
 #include "veljpeginterface.h"
@@ -77,7 +78,9 @@ void* encode_420(const uint8_t* pixels, int32_t width, int32_t height, uint32_t 
     if (!even || chroma.step != 1) {
         const size_t luma_bytes = even ? 0 : turbo.lumaWidth * turbo.lumaHeight;
         const size_t chroma_bytes = turbo.chromaWidth * turbo.chromaHeight;
-        scratch = qk::jpeg::allocate(luma_bytes + 2 * chroma_bytes);
+        // Frame-sized scratch is mapped in with one system call, not faulted
+        // in a page at a time by the de-interleaving pass.
+        scratch.reset(static_cast<uint8_t*>(qk::platform::allocate_pixels(luma_bytes + 2 * chroma_bytes)));
         if (!scratch) return nullptr;
         uint8_t* luma = scratch.get();
         if (!even) {
