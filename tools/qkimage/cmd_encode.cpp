@@ -16,10 +16,5 @@ int cmd_encode(int argc, char** argv) {
     }
     ImageHandle frame = read_frame(kName, options.paths[0], width, height, format);
     if (!frame) return 1;
-    ImageHandle jpeg = hold(QKImage_encodeToJpeg(frame.get(), quality));
-    if (!jpeg) {
-        return operation_failed(kName, "the JPEG codec could not encode the " + describe(width, height, format) +
-                                           " frame");
-    }
-    return write_output(kName, options.paths[1], jpeg->data, jpeg->size) ? 0 : 1;
+    return write_jpeg(kName, options.paths[1], *frame, quality);
 }

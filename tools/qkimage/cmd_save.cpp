@@ -48,14 +48,7 @@ int cmd_save(int argc, char** argv) {
     }
     ImageHandle frame = read_frame(kName, options.paths[0], width, height, format);
     if (!frame) return 1;
-    if (kind == Kind::kJpeg) {
-        ImageHandle jpeg = hold(QKImage_encodeToJpeg(frame.get(), quality));
-        if (!jpeg) {
-            return operation_failed(kName, "the JPEG codec could not encode the " + describe(width, height, format) +
-                                               " frame");
-        }
-        return write_output(kName, path, jpeg->data, jpeg->size) ? 0 : 1;
-    }
+    if (kind == Kind::kJpeg) return write_jpeg(kName, path, *frame, quality);
     const uint64_t expected = kind == Kind::kRaw ? QKImage_requiredSize(width, height, format) : 0;
     return save_through_library(kName, *frame, path, kind == Kind::kPng ? ".png" : "", quality, expected) ? 0 : 1;
 }

@@ -216,6 +216,15 @@ bool write_output(const char* command, const std::string& path, const void* data
     return file.open(command, path) && file.write(data, size) && file.commit();
 }
 
+int write_jpeg(const char* command, const std::string& path, const QKImage& frame, int32_t quality) {
+    ImageHandle jpeg = hold(QKImage_encodeToJpeg(&frame, quality));
+    if (!jpeg) {
+        return operation_failed(command, "the JPEG codec could not encode the " +
+                                             describe(frame.width, frame.height, frame.format) + " frame");
+    }
+    return write_output(command, path, jpeg->data, jpeg->size) ? 0 : 1;
+}
+
 bool write_frame(const char* command, const std::string& path, const QKImage& image) {
     const uint64_t bytes = QKImage_requiredSize(image.width, image.height, image.format);
     if (image.data == nullptr || bytes == 0 || QKImage_size(&image) < bytes) {

@@ -78,6 +78,8 @@ private:
 // Writes bytes, or an image's raw frame, to an OutputFile; false after a message.
 bool write_output(const char* command, const std::string& path, const void* data, uint64_t size);
 bool write_frame(const char* command, const std::string& path, const QKImage& image);
+// Encodes a frame as a JPEG and writes it; the command's exit status.
+int write_jpeg(const char* command, const std::string& path, const QKImage& frame, int32_t quality);
 
 // Saves with the library's QKImage_saveToFile into a temporary whose name
 // ends in `suffix` (so its path rule picks the same kind), checks that the
