@@ -80,7 +80,8 @@ void turn_copy(const uint8_t* src, size_t src_row_bytes, int32_t width, int32_t 
 // Draws `source` scaled by the factors over the whole target: target pixel
 // (c, r) takes the source pixel under its centre mapped back,
 // ((c + 0.5) / scale_x, (r + 0.5) / scale_y), clamped into the source.
-// Factors must be positive (otherwise nothing is drawn).
+// Factors must be positive (otherwise nothing is drawn). The bitmaps must
+// not overlap. On x86 a target of 8 MiB or more is written past the caches.
 void draw_scaled(const Bitmap& source, float scale_x, float scale_y, Bitmap& target);
 
 }  // namespace platform
