@@ -92,13 +92,26 @@ TEST(Rotate, OtherFormatsThroughRgba) {
 // hand. A destination without buffer gets one; one sharing the source's
 // buffer gets what a separate one gets, nothing of its old content left.
 TEST(Scale, NearestPixelUnderTheCentre) {
-    // Exact doubling and halving, wide enough for whole vectors and tails
-    // (and, at 4200 columns, two strips of the column table).
+    // Exact doubling and halving, wide enough for whole vectors and tails;
+    // other factors (centres at (2i + 1) from / 2n) through the column table,
+    // at 4200 columns in two strips of it. Targets past 8 MiB are streamed:
+    // a doubling with runs of three rows, a halving, a factor of 1.5.
     auto doubled = [](int n) { std::vector<int> v; for (int i = 0; i < n; ++i) v.push_back(i / 2); return v; };
     auto halved = [](int n) { std::vector<int> v; for (int i = 0; i < n; ++i) v.push_back(2 * i + 1); return v; };
+    auto mapped = [](int n, int from) {
+        std::vector<int> v;
+        for (int i = 0; i < n; ++i) v.push_back((2 * i + 1) * from / (2 * n));
+        return v;
+    };
     const struct { int32_t sw, sh, dw, dh; std::vector<int> cols, rows; } cases[] = {
         {9, 3, 18, 6, doubled(18), doubled(6)}, {22, 6, 11, 3, halved(11), halved(3)},
         {2100, 2, 4200, 4, doubled(4200), doubled(4)}, {8400, 2, 4200, 1, halved(4200), halved(1)},
+        {23, 7, 11, 3, halved(11), halved(3)},        // the last source column unused
+        {7, 3, 14, 5, doubled(14), {0, 0, 1, 2, 2}},  // rows not doubled
+        {20, 6, 30, 9, mapped(30, 20), mapped(9, 6)}, {30, 9, 20, 6, mapped(20, 30), mapped(6, 9)},
+        {2800, 2, 4200, 3, mapped(4200, 2800), {0, 1, 1}},
+        {1024, 700, 2048, 2100, doubled(2048), mapped(2100, 700)}, {4096, 2050, 2048, 1025, halved(2048), halved(1025)},
+        {1600, 900, 2400, 1350, mapped(2400, 1600), mapped(1350, 900)},
         {3, 3, 3, 3, {0, 1, 2}, {0, 1, 2}},        // equal sizes: a copy
         {4, 4, 2, 2, {1, 3}, {1, 3}},              // one pixel of each 2x2 block, no averaging
         {2, 2, 4, 4, {0, 0, 1, 1}, {0, 0, 1, 1}},  // each pixel repeated in a 2x2 block
