@@ -40,7 +40,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     // A copy of exactly the picture's bytes: reading past them shows.
     const std::vector<uint8_t> rest = in.rest();
     std::vector<uint8_t> picture(rest.begin(), rest.end());
-    const qkfuzz::Snapshot before(frame.image, frame.length());
+    const qkfuzz::Snapshot before(frame);
     const int32_t status = QKImage_decodeFromJpeg(frame.image, picture.empty() ? nullptr : picture.data(),
                                                   picture.size());
     qkfuzz::check(picture == rest, "decode wrote to its input");

@@ -53,7 +53,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const size_t written = contents.empty() ? 0 : fwrite(contents.data(), 1, contents.size(), file);
     qkfuzz::check(fclose(file) == 0 && written == contents.size(), "cannot write the file to load");
 
-    const qkfuzz::Snapshot before(frame.image, frame.length());
+    const qkfuzz::Snapshot before(frame);
     const int32_t status = QKImage_loadFromFile(frame.image, g_path.c_str());
     unlink(g_path.c_str());
     qkfuzz::check_decoded(frame, before, status, /*decoded=*/false);

@@ -1,6 +1,7 @@
-// Fuzz target: the option-string readers against sscanf, the value checks
-// against their documented rules, and the process-wide register against a
-// model of it kept here.
+// Fuzz target: the option-string readers against sscanf, and the register
+// and value checks driven with records, names and values from the input,
+// held to what each answer implies (a record found by name has that name,
+// one found by key that key, a record registered is found by its key).
 //
 // Input: commands until the input ends (at most 16), each one byte mod 4:
 //   0 read:     flags (bit 0: null string, bit 1: null name), the string
@@ -8,7 +9,8 @@
 //               float default (u32 bits);
 //   1 register: a record (see take_record) registered from a static pool;
 //   2 find:     a name (text(12)), flags (bit 1: null name), a key (u32)
-//               and a byte: for flags & 1 the key is model record `byte`'s;
+//               and a byte: for flags & 1 the key is registered record
+//               `byte`'s (in ascending key order);
 //   3 check:    a record (not registered), flags (bit 0: null record, bit 1:
 //               null string), an int (u32), a float (u32 bits) and a string
 //               (text(8); for flags & 4 the name of enumeration entry `byte`).
@@ -17,9 +19,9 @@
 #include <string.h>
 
 #include <algorithm>
-#include <cctype>
+#include <iterator>
+#include <map>
 #include <string>
-#include <vector>
 
 #include "fuzz/fuzz_support.h"
 #include "qkcore/qk_options.h"
@@ -29,47 +31,14 @@ namespace {
 using qkfuzz::check;
 using qkfuzz::Input;
 
-// ---- Readers ----
-
-// The text of the value of the first item "name=value" of the string (up to
-// the item's closing comma), or false when there is none or the string or
-// name cannot be read.
-bool reference_item(const char* options, const char* name, std::string* value) {
-    if (options == nullptr || name == nullptr || name[0] == '\0' || strpbrk(name, "=,") != nullptr) return false;
-    const std::string all(options), prefix = std::string(name) + "=";
-    for (size_t start = 0;;) {
-        const size_t end = all.find(',', start);
-        const std::string item = all.substr(start, end == std::string::npos ? std::string::npos : end - start);
-        if (item.compare(0, prefix.size(), prefix) == 0) {
-            *value = item.substr(prefix.size());
-            return true;
-        }
-        if (end == std::string::npos) return false;
-        start = end + 1;
-    }
+// Where the value of the first item "name=..." of the string starts, or null:
+// the first ",name=" of the string with a comma put in front.
+const char* item_value(const char* options, const char* name) {
+    if (options == nullptr || name == nullptr || name[0] == '\0' || strpbrk(name, "=,") != nullptr) return nullptr;
+    const std::string prefix = "," + std::string(name) + "=";
+    const size_t at = ("," + std::string(options)).find(prefix);
+    return at == std::string::npos ? nullptr : options + at + prefix.size() - 1;
 }
-
-// What "%d" takes, read exactly; false when sscanf fails or the value lies
-// outside int32 (documented: unreadable rather than wrapped).
-bool reference_int(const std::string& text, int32_t* value) {
-    int consumed = -1;
-    sscanf(text.c_str(), "%*d%n", &consumed);
-    if (consumed < 0) return false;
-    size_t i = 0;
-    while (isspace(static_cast<unsigned char>(text[i]))) ++i;
-    const bool negative = text[i] == '-';
-    if (text[i] == '-' || text[i] == '+') ++i;
-    int64_t magnitude = 0;
-    for (; i < static_cast<size_t>(consumed); ++i) {
-        magnitude = std::min<int64_t>(magnitude * 10 + (text[i] - '0'), int64_t{1} << 40);
-    }
-    const int64_t read = negative ? -magnitude : magnitude;
-    if (read < INT32_MIN || read > INT32_MAX) return false;
-    *value = static_cast<int32_t>(read);
-    return true;
-}
-
-bool same_float(float a, float b) { return (a != a && b != b) || memcmp(&a, &b, sizeof(a)) == 0; }
 
 float as_float(uint32_t bits) {
     float value;
@@ -85,19 +54,16 @@ void read_values(Input& in) {
     const char* o = (flags & 1) != 0 ? nullptr : options.c_str();
     const char* n = (flags & 2) != 0 ? nullptr : name.c_str();
 
-    std::string text;
-    const bool found = reference_item(o, n, &text);
-    int32_t expectI = defaultI;
-    if (found && !reference_int(text, &expectI)) expectI = defaultI;
-    float expectF = defaultF;
-    if (!found || sscanf(text.c_str(), "%f", &expectF) != 1) expectF = defaultF;
-
-    check(QKOption_ParseStringI(o, n, defaultI) == expectI, "ParseStringI differs from sscanf %d");
-    check(same_float(QKOption_ParseStringF(o, n, defaultF), expectF), "ParseStringF differs from sscanf %f");
+    // "%d" and "%f" as sscanf reads them; an integer past 32 bits is unreadable.
+    const char* text = item_value(o, n);
+    long long i = 0;
+    float f = defaultF, got = QKOption_ParseStringF(o, n, defaultF);
+    if (text == nullptr || sscanf(text, "%lld", &i) != 1 || i < INT32_MIN || i > INT32_MAX) i = defaultI;
+    if (text == nullptr || sscanf(text, "%f", &f) != 1) f = defaultF;
+    check(QKOption_ParseStringI(o, n, defaultI) == i, "ParseStringI differs from sscanf %d");
+    check(memcmp(&got, &f, sizeof(f)) == 0, "ParseStringF differs from sscanf %f");
     check(o == nullptr || options == o, "a reader wrote to its string");
 }
-
-// ---- Records ----
 
 // A record with storage for its name and enumeration that lives as long as
 // the process: the register keeps only the record's address.
@@ -110,28 +76,24 @@ struct Slot {
 };
 constexpr size_t kPool = 64;
 Slot g_pool[kPool];
+std::map<int32_t, const QKOption_t*> g_registered;  // by key, in ascending order
 
-// The register as the documentation describes it: records in ascending key
-// order, keys drawn from 0x13370001 up.
-std::vector<const QKOption_t*> g_model;
-uint32_t g_lastKey = 0x13370000u;
-
-bool same_name(const QKOption_t* record, const char* name) {
-    return record->name != nullptr && name != nullptr && strcmp(record->name, name) == 0;
+const QKOption_t* registered(uint8_t pick) {
+    return std::next(g_registered.begin(), pick % g_registered.size())->second;
 }
 
 // Fills the slot from the input: key (byte mod 4: 0 and 1 no key, 2 the key
-// of model record `byte`, 3 a raw u32), name (byte mod 8 == 7: null, else
-// text(12)), type (byte mod 5: the four types, 4: a raw u32), min and max
-// (u32 bits each) and, for ENUM, 0..4 entries (byte mod 5, each a value byte
-// minus 1 and a text(8) name) or null (count byte 255).
+// of registered record `byte`, 3 a raw u32), name (byte mod 8 == 7: null,
+// else text(12)), type (byte mod 5: the four types, 4: a raw u32), min and
+// max (u32 bits each) and, for ENUM, 0..4 entries (byte mod 5, each a value
+// byte minus 1 and a text(8) name) or null (count byte 255).
 void take_record(Input& in, Slot& slot) {
     slot = Slot{};
     QKOption_t& r = slot.record;
     switch (in.byte() % 4) {
         case 2: {
             const uint8_t pick = in.byte();
-            if (!g_model.empty()) r.key = g_model[pick % g_model.size()]->key;
+            if (!g_registered.empty()) r.key = registered(pick)->key;
             break;
         }
         case 3: r.key = static_cast<int32_t>(in.u32()); break;
@@ -160,11 +122,8 @@ void take_record(Input& in, Slot& slot) {
     r.enumValues = slot.values;
 }
 
-const QKOption_t* model_first(bool (*matches)(const QKOption_t*, const void*), const void* what) {
-    for (const QKOption_t* record : g_model) {
-        if (matches(record, what)) return record;
-    }
-    return nullptr;
+bool same_name(const QKOption_t* record, const char* name) {
+    return record->name != nullptr && name != nullptr && strcmp(record->name, name) == 0;
 }
 
 void register_record(Input& in) {
@@ -173,40 +132,18 @@ void register_record(Input& in) {
     take_record(in, *slot);
     QKOption_t& r = slot->record;
     const QKOption_t before = r;
-
-    int32_t expectResult = 0, expectKey = r.key;
-    bool added = false;
-    if (r.name != nullptr) {
-        const QKOption_t* same = nullptr;
-        if (r.key == 0) {
-            same = model_first(
-                [](const QKOption_t* m, const void* o) {
-                    const QKOption_t* option = static_cast<const QKOption_t*>(o);
-                    return m->type == option->type && same_name(m, option->name);
-                },
-                &r);
-            expectKey = same != nullptr ? same->key : static_cast<int32_t>(++g_lastKey);
-        }
-        if (same != nullptr) {
-            expectResult = 1;
-        } else {
-            const bool taken = std::any_of(g_model.begin(), g_model.end(),
-                                           [&](const QKOption_t* m) { return m->key == expectKey; });
-            expectResult = taken ? 0 : 1;
-            added = !taken;
-        }
-    }
     const int32_t result = QKOption_RegisterNew(&r);
-    check(result == expectResult, "RegisterNew: unexpected result");
-    check(r.key == expectKey, "RegisterNew: unexpected key");
     check(r.name == before.name && r.type == before.type && r.min.i == before.min.i && r.max.i == before.max.i &&
-              r.enumValues == before.enumValues,
-          "RegisterNew wrote more than the key");
-    if (!added) return;
-    slot->registered = true;
-    g_model.insert(std::upper_bound(g_model.begin(), g_model.end(), r.key,
-                                    [](int32_t key, const QKOption_t* m) { return key < m->key; }),
-                   &r);
+              r.enumValues == before.enumValues && (before.key == 0 || r.key == before.key),
+          "RegisterNew wrote more than a new key");
+    if (result == 0) {
+        return check(r.name == nullptr || QKOption_FindById(r.key) != nullptr, "RegisterNew refused a free key");
+    }
+    // Registered, or given the key of an earlier record of its name and type.
+    const QKOption_t* found = QKOption_FindById(r.key);
+    check(result == 1 && r.name != nullptr && found != nullptr && found->type == r.type && same_name(found, r.name),
+          "RegisterNew: a record that its key does not find");
+    if (found == &r) slot->registered = true, g_registered[r.key] = &r;
 }
 
 void find(Input& in) {
@@ -214,24 +151,21 @@ void find(Input& in) {
     const uint8_t flags = in.byte();
     int32_t key = static_cast<int32_t>(in.u32());
     const uint8_t pick = in.byte();
-    if ((flags & 1) != 0 && !g_model.empty()) key = g_model[pick % g_model.size()]->key;
+    const QKOption_t* picked = nullptr;
+    if ((flags & 1) != 0 && !g_registered.empty()) key = (picked = registered(pick))->key;
     const char* n = (flags & 2) != 0 ? nullptr : name.c_str();
-
-    const QKOption_t* byName =
-        n == nullptr ? nullptr
-                     : model_first([](const QKOption_t* m, const void* s) { return same_name(m, static_cast<const char*>(s)); },
-                                   n);
-    const QKOption_t* byKey =
-        model_first([](const QKOption_t* m, const void* k) { return m->key == *static_cast<const int32_t*>(k); },
-                    &key);
-    check(QKOption_FindByName(n) == byName, "FindByName differs from the model");
-    check(QKOption_FindIdByName(n) == (byName != nullptr ? byName->key : 0), "FindIdByName differs from the model");
-    check(QKOption_FindById(key) == byKey, "FindById differs from the model");
-    check(QKOption_FindNameById(key) == (byKey != nullptr ? byKey->name : nullptr),
-          "FindNameById differs from the model");
+    const QKOption_t* byName = QKOption_FindByName(n);
+    const QKOption_t* byKey = QKOption_FindById(key);
+    check(byName == nullptr ? QKOption_FindIdByName(n) == 0
+                            : same_name(byName, n) && QKOption_FindIdByName(n) == byName->key,
+          "FindByName or FindIdByName: a record of another name");
+    check(byKey == nullptr ? QKOption_FindNameById(key) == nullptr
+                           : byKey->key == key && QKOption_FindNameById(key) == byKey->name,
+          "FindById or FindNameById: a record of another key");
+    if (picked == nullptr) return;
+    const QKOption_t* first = QKOption_FindByName(picked->name);
+    check(byKey == picked && first != nullptr && first->key <= key, "a registered record is not found");
 }
-
-// ---- Value checks ----
 
 void check_values(Input& in) {
     Slot slot;
@@ -241,31 +175,22 @@ void check_values(Input& in) {
     const int32_t valueI = static_cast<int32_t>(in.u32());
     const float valueF = as_float(in.u32());
     std::string valueS = in.text(8);
+    bool entry = false;
     if ((flags & 4) != 0 && r.enumValues != nullptr) {
         const uint8_t pick = in.byte();
         int count = 0;
         while (r.enumValues[count].value != QK_OPTION_ENUM_END) ++count;
-        if (count > 0) valueS = r.enumValues[pick % count].name;
+        if ((entry = count > 0)) valueS = r.enumValues[pick % count].name;
     }
     const QKOption_t* option = (flags & 1) != 0 ? nullptr : &r;
     const char* s = (flags & 2) != 0 ? nullptr : valueS.c_str();
-
-    int32_t expectI = 0, expectF = 0, expectS = 0;
-    if (option != nullptr && r.type == QK_OPTION_INTEGER) {
-        expectI = (r.min.i == 0 && r.max.i == 0) || (r.min.i <= valueI && valueI <= r.max.i);
-    }
-    if (option != nullptr && r.type == QK_OPTION_FLOAT) {
-        expectF = (r.min.f == 0.0f && r.max.f == 0.0f) || (r.min.f <= valueF && valueF <= r.max.f);
-    }
-    if (option != nullptr && r.type == QK_OPTION_STRING) expectS = 1;
-    if (option != nullptr && r.type == QK_OPTION_ENUM && r.enumValues != nullptr && s != nullptr) {
-        for (const QKOptionEnum_t* e = r.enumValues; e->value != QK_OPTION_ENUM_END; ++e) {
-            if (e->name != nullptr && strcmp(e->name, s) == 0) expectS = 1;
-        }
-    }
-    check(QKOption_CheckValueI(option, valueI) == expectI, "CheckValueI differs from its rule");
-    check(QKOption_CheckValueF(option, valueF) == expectF, "CheckValueF differs from its rule");
-    check(QKOption_CheckValueS(option, s) == expectS, "CheckValueS differs from its rule");
+    const uint32_t type = option != nullptr ? r.type : UINT32_MAX;
+    const int32_t i = QKOption_CheckValueI(option, valueI), f = QKOption_CheckValueF(option, valueF);
+    const int32_t text = QKOption_CheckValueS(option, s);
+    check(i == (type == QK_OPTION_INTEGER && i == 1) && f == (type == QK_OPTION_FLOAT && f == 1) &&
+              text == (type == QK_OPTION_STRING || (type == QK_OPTION_ENUM && text == 1)),
+          "CheckValue: an answer other than 0 or 1, or 1 for another type");
+    check(!entry || s == nullptr || option == nullptr || text == 1, "CheckValueS refused a name of the enumeration");
 }
 
 }  // namespace

@@ -9,6 +9,7 @@
 #include <algorithm>
 
 #include "qkcore/qk_log.h"
+#include "support/images.h"
 
 namespace qkfuzz {
 
@@ -18,42 +19,27 @@ void check(bool ok, const char* what) {
     abort();
 }
 
-namespace {
-
-int format_and_drop(int level, ...) {
+// Each message is formatted (so that a bad log argument still shows under the
+// sanitizers) and dropped.
+static int format_and_drop(int level, ...) {
     va_list args;
     va_start(args, level);
     const char* format = va_arg(args, const char*);
     char line[512];
     vsnprintf(line, sizeof(line), format, args);
-    va_end(args);
-    return 0;
+    return va_end(args), 0;
 }
-
-}  // namespace
-
 void quiet_log() { HX_LogMsg = format_and_drop; }
 
-uint8_t Input::byte() {
-    if (size_ == 0) return 0;
-    --size_;
-    return *data_++;
-}
-
+uint8_t Input::byte() { return size_ == 0 ? 0 : (--size_, *data_++); }
+// Low byte first: each read is a statement of its own, so the order is fixed.
 uint16_t Input::u16() {
     const uint16_t low = byte();
     return static_cast<uint16_t>(low | byte() << 8);
 }
-
 uint32_t Input::u32() {
     const uint32_t low = u16();
     return low | static_cast<uint32_t>(u16()) << 16;
-}
-
-int32_t Input::range(int32_t lo, int32_t hi) {
-    const uint64_t span = static_cast<uint64_t>(int64_t{hi} - lo) + 1;
-    const uint64_t pick = span <= 256 ? byte() % span : u32() % span;
-    return static_cast<int32_t>(lo + static_cast<int64_t>(pick));
 }
 
 int32_t Input::dimension() {
@@ -81,52 +67,16 @@ std::string Input::text(size_t max) {
 
 std::vector<uint8_t> Input::rest() {
     std::vector<uint8_t> bytes(data_, data_ + size_);
-    data_ += size_;
-    size_ = 0;
+    data_ += size_, size_ = 0;
     return bytes;
-}
-
-bool is_yuv420(uint32_t f) {
-    return f == QK_FORMAT_NV12 || f == QK_FORMAT_NV21 || f == QK_FORMAT_YV12 || f == QK_FORMAT_YUVP;
-}
-
-bool is_rgb(uint32_t f) {
-    return f == QK_FORMAT_RGBA || f == QK_FORMAT_BGRA || f == QK_FORMAT_ARGB || f == QK_FORMAT_ABGR ||
-           f == QK_FORMAT_RGB8 || f == QK_FORMAT_BGR8;
-}
-
-uint64_t rule_bytes(int32_t width, int32_t height, uint32_t format) {
-    if (width < 1 || height < 1) return 0;
-    const unsigned __int128 pixels = static_cast<unsigned __int128>(width) * static_cast<unsigned>(height);
-    unsigned __int128 bytes;
-    switch (format) {
-        case QK_FORMAT_RGBA:
-        case QK_FORMAT_BGRA:
-        case QK_FORMAT_ARGB:
-        case QK_FORMAT_ABGR: bytes = 4 * pixels; break;
-        case QK_FORMAT_RGB8:
-        case QK_FORMAT_BGR8: bytes = 3 * pixels; break;
-        case QK_FORMAT_GREY: bytes = pixels; break;
-        case QK_FORMAT_YUYV:
-        case QK_FORMAT_YVYU:
-        case QK_FORMAT_D16: bytes = 2 * pixels; break;
-        case QK_FORMAT_NV12:
-        case QK_FORMAT_NV21:
-        case QK_FORMAT_YV12:
-        case QK_FORMAT_YUVP: bytes = (3 * pixels + 1) / 2; break;
-        case QK_FORMAT_PCL: bytes = 16 * pixels + 36; break;
-        default: return 0;
-    }
-    return bytes > INT32_MAX ? 0 : static_cast<uint64_t>(bytes);
 }
 
 uint64_t claimed_bytes(int32_t width, int32_t height, uint32_t format, uint64_t size, uint32_t chromaOffset) {
     if (size != 0) return size;
-    const uint64_t rule = rule_bytes(width, height, format);
-    if (rule == 0 || chromaOffset == 0 || !is_yuv420(format)) return rule;
-    const uint64_t luma = static_cast<uint64_t>(width) * static_cast<uint64_t>(height);
-    const uint64_t end = uint64_t{chromaOffset} + luma / 2;
-    return end > rule ? end : rule;
+    const uint64_t rule = QKImage_requiredSize(width, height, format);
+    if (rule == 0 || chromaOffset == 0 || !qktest::is_yuv420(format)) return rule;
+    const uint64_t end = uint64_t{chromaOffset} + uint64_t(width) * uint64_t(height) / 2;
+    return std::max(end, rule);
 }
 
 void fill(uint8_t* data, size_t bytes, uint8_t seed) {
@@ -140,7 +90,7 @@ void fill(uint8_t* data, size_t bytes, uint8_t seed) {
 
 Frame::~Frame() {
     QKImage_destroy(image);
-    for (uint8_t* buffer : owned_) free(buffer);
+    std::for_each(owned_.begin(), owned_.end(), free);
 }
 
 uint8_t* Frame::new_buffer(size_t bytes, uint8_t seed) {
@@ -152,8 +102,7 @@ uint8_t* Frame::new_buffer(size_t bytes, uint8_t seed) {
 }
 
 uint32_t Frame::chroma(Input& in, int32_t width, int32_t height) {
-    const uint32_t luma = static_cast<uint32_t>(static_cast<uint64_t>(static_cast<uint32_t>(width)) *
-                                                static_cast<uint32_t>(height));
+    const uint32_t luma = static_cast<uint32_t>(width) * static_cast<uint32_t>(height);
     switch (in.byte() % 6) {
         case 1: return luma;
         case 2: return luma + 2u * in.byte();
@@ -164,14 +113,10 @@ uint32_t Frame::chroma(Input& in, int32_t width, int32_t height) {
 }
 
 int32_t Frame::recorded(Input& in, uint64_t claim) {
-    uint64_t size;
+    uint64_t size = claim, cut;
     switch (in.byte() % 5) {
-        case 0: size = claim; break;
-        case 1: {
-            const uint64_t cut = 1 + uint64_t{in.byte()};
-            size = claim > cut ? claim - cut : 1;
-            break;
-        }
+        case 0: break;
+        case 1: size = claim > (cut = 1 + uint64_t{in.byte()}) ? claim - cut : 1; break;
         case 2: size = claim + 1 + in.byte(); break;
         case 3: size = 1 + uint64_t{in.u16()}; break;
         default: return -1;
@@ -182,44 +127,28 @@ int32_t Frame::recorded(Input& in, uint64_t claim) {
 
 void Frame::make(Input& in) {
     QKImage_destroy(image);
-    image = nullptr;
-    data_ = nullptr, length_ = 0;
+    image = nullptr, data_ = nullptr, length_ = 0;
     const int32_t width = in.dimension(), height = in.dimension();
     const uint32_t format = in.format();
-    const uint64_t rule = rule_bytes(width, height, format);
-    check(QKImage_requiredSize(width, height, format) == rule, "requiredSize differs from the size rule");
-    switch (in.byte() % 4) {
-        case 1:
-            if (rule <= kMaxBytes) {
-                image = QKImage_createNew(width, height, format);
-                check((image != nullptr) == (rule != 0), "createNew disagrees with the size rule");
-                check(image == nullptr || (image->size == rule && image->data != nullptr && image->isWrapped == 0 &&
-                                           image->chromaOffset == 0),
-                      "createNew made an image unlike its size rule");
-            }
-            break;
-        case 2: {
-            const uint32_t chroma = Frame::chroma(in, width, height);
-            const uint64_t claim = claimed_bytes(width, height, format, 0, chroma);
-            if (claim != 0 && claim <= kMaxBytes) {
-                uint8_t* buffer = new_buffer(claim, 0);
-                image = QKImage_createWrap(buffer, width, height, format, 0, chroma);
-                adopt(buffer, claim);
-            }
-            break;
+    // Every format with a rule takes at least a byte a pixel: a smaller
+    // answer is a size computed past its type's range.
+    const uint64_t rule = QKImage_requiredSize(width, height, format);
+    check(rule == 0 || (width > 0 && height > 0 && rule >= uint64_t(width) * uint64_t(height) && rule <= INT32_MAX),
+          "requiredSize is too small for the picture or past INT32_MAX");
+    const int kind = in.byte() % 4;
+    if (kind == 1 && rule <= kMaxBytes) {
+        image = QKImage_createNew(width, height, format);
+        check(image == nullptr ? rule == 0 : (image->size == rule && image->data != nullptr),
+              "createNew: a buffer unlike the size rule");
+    } else if (kind >= 2) {
+        const uint32_t chroma = Frame::chroma(in, width, height);
+        const int32_t size = kind == 3 ? recorded(in, claimed_bytes(width, height, format, 0, chroma)) : 0;
+        const uint64_t claim = claimed_bytes(width, height, format, size > 0 ? size : 0, chroma);
+        if (claim != 0 && claim <= kMaxBytes) {
+            uint8_t* buffer = new_buffer(claim, 0);
+            image = QKImage_createWrap(buffer, width, height, format, size, chroma);
+            adopt(buffer, claim);
         }
-        case 3: {
-            const uint32_t chroma = Frame::chroma(in, width, height);
-            const int32_t size = recorded(in, claimed_bytes(width, height, format, 0, chroma));
-            const uint64_t claim = claimed_bytes(width, height, format, size > 0 ? size : 0, chroma);
-            if (claim != 0 && claim <= kMaxBytes) {
-                uint8_t* buffer = new_buffer(claim, 0);
-                image = QKImage_createWrap(buffer, width, height, format, size, chroma);
-                adopt(buffer, claim);
-            }
-            break;
-        }
-        default: break;
     }
     if (image == nullptr) image = QKImage_createEmpty(width, height, format);
     check(image != nullptr, "createEmpty failed");
@@ -233,72 +162,37 @@ size_t Frame::length() const {
     return image->isWrapped == 0 ? static_cast<size_t>(image->size) : 0;
 }
 
-Snapshot::Snapshot(const QKImage* image, size_t length)
-    : data(image->data),
-      width(image->width),
-      height(image->height),
-      format(image->format),
-      isWrapped(image->isWrapped),
-      size(image->size),
-      chromaOffset(image->chromaOffset) {
-    if (data != nullptr) bytes.assign(data, data + length);
+Snapshot::Snapshot(const Frame& frame) {
+    const QKImage& i = *frame.image;
+    data = i.data, width = i.width, height = i.height, format = i.format, isWrapped = i.isWrapped, size = i.size,
+    chromaOffset = i.chromaOffset;
+    if (data != nullptr) bytes.assign(data, data + frame.length());
 }
 
-bool Snapshot::same_fields(const QKImage* image) const {
-    return data == image->data && width == image->width && height == image->height && format == image->format &&
-           isWrapped == image->isWrapped && size == image->size && chromaOffset == image->chromaOffset;
-}
-
-bool Snapshot::operator==(const Snapshot& other) const {
-    return data == other.data && width == other.width && height == other.height && format == other.format &&
-           isWrapped == other.isWrapped && size == other.size && chromaOffset == other.chromaOffset &&
-           bytes == other.bytes;
-}
-
-void check_decoded(const Frame& frame, const Snapshot& before, int32_t status, bool decoded) {
+void check_holds(const Frame& frame, bool picture, const char* what) {
     const QKImage* image = frame.image;
-    if (status != QK_OK) {
-        if (before.data != nullptr && before.isWrapped != 0) {
-            check(image->data == before.data && image->isWrapped != 0, "a failed decode dropped the caller's buffer");
-        }
-        if (status == QK_ERROR_INVALID_SIZE && before.data != nullptr && image->data == before.data) {
-            check(Snapshot(image, before.bytes.size()).bytes == before.bytes,
-                  "a buffer refused as too small was written");
-        }
-        return;
-    }
-    check(image->data != nullptr && image->width > 0 && image->height > 0, "a decoded image without picture");
+    check(image->data != nullptr, what);
     const uint64_t claimed = QKImage_size(image);
-    const uint64_t rule = rule_bytes(image->width, image->height, image->format);
-    check(!decoded || rule == 0 || claimed >= rule, "a decoded image records less than its picture");
-    // The caller's buffer has the bytes the target gave it; any other is the
+    // A caller's buffer has the bytes the target gave it; any other is the
     // library's, from malloc.
-    const uint64_t holds = image->data == before.data && before.isWrapped != 0 ? before.bytes.size()
-                                                                              : malloc_usable_size(image->data);
-    check(claimed <= holds, "a decoded image claims more bytes than its buffer holds");
+    const uint64_t holds = image->isWrapped != 0 ? frame.length() : malloc_usable_size(image->data);
+    const uint64_t rule = QKImage_requiredSize(image->width, image->height, image->format);
+    check(claimed <= holds && (!picture || claimed >= rule), what);
     volatile uint8_t sum = 0;
     for (uint64_t i = 0; i < claimed; ++i) sum = static_cast<uint8_t>(sum + image->data[i]);
     (void)sum;
 }
 
-std::vector<size_t> pixel_places(const QKImage& image, int32_t x, int32_t y) {
-    const size_t w = static_cast<size_t>(image.width), h = static_cast<size_t>(image.height);
-    const size_t pixel = static_cast<size_t>(y) * w + static_cast<size_t>(x);
-    if (!is_yuv420(image.format)) {
-        const size_t bpp = (image.format == QK_FORMAT_RGB8 || image.format == QK_FORMAT_BGR8) ? 3 : 4;
-        std::vector<size_t> places;
-        for (size_t i = 0; i < bpp; ++i) places.push_back(pixel * bpp + i);
-        return places;
+void check_decoded(const Frame& frame, const Snapshot& before, int32_t status, bool decoded) {
+    const QKImage* image = frame.image;
+    if (status == QK_OK) {
+        check(image->width > 0 && image->height > 0, "a decoded image without picture");
+        return check_holds(frame, decoded, "a decoded image claims more than its buffer or less than its picture");
     }
-    const size_t base = image.chromaOffset != 0 ? image.chromaOffset : w * h;
-    const size_t pair = base + (y / 2) * w + (x / 2) * 2;
-    const size_t plane = base + (y / 2) * (w / 2) + x / 2, quarter = w * h / 4;
-    switch (image.format) {
-        case QK_FORMAT_NV12: return {pixel, pair, pair + 1};
-        case QK_FORMAT_NV21: return {pixel, pair + 1, pair};
-        case QK_FORMAT_YV12: return {pixel, plane + quarter, plane};
-        default: return {pixel, plane, plane + quarter};  // YUVP
-    }
+    check(before.isWrapped == 0 || (image->data == before.data && image->isWrapped != 0),
+          "a failed decode dropped the caller's buffer");
+    check(status != QK_ERROR_INVALID_SIZE || image->data != before.data || Snapshot(frame).bytes == before.bytes,
+          "a buffer refused as too small was written");
 }
 
 }  // namespace qkfuzz

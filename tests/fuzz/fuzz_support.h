@@ -1,8 +1,10 @@
 // What every fuzz target shares: a reader that takes all of a target's
 // parameters from its input bytes, the check that stops the run when the
-// library breaks its contract, a quiet log hook, the size rule written out
-// independently of the library, and images over buffers of exactly the size
-// they claim (so that AddressSanitizer sees the first byte past them).
+// library breaks its contract, a quiet log hook, and images over buffers of
+// exactly the size they claim (so that AddressSanitizer sees the first byte
+// past them). The targets drive the calls; the sanitizers and a few cheap
+// invariants judge them. What each result must be byte for byte is the unit
+// tests' business.
 //
 // Inputs are read front to back; a reader past the end yields zeros, so every
 // prefix of an input is an input too. The encodings below are what the
@@ -15,6 +17,7 @@
 #include <stdint.h>
 
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "qkcore/qk_image.h"
@@ -24,8 +27,7 @@ namespace qkfuzz {
 // Stops the run with the message when `ok` is false: a finding.
 void check(bool ok, const char* what);
 
-// Points HX_LogMsg at a hook that formats each message (so that a bad log
-// argument still shows under the sanitizers) and drops it.
+// Points HX_LogMsg at a hook that drops every message.
 void quiet_log();
 
 class Input {
@@ -36,9 +38,6 @@ public:
     uint8_t byte();
     uint16_t u16();  // little-endian
     uint32_t u32();  // little-endian
-    bool flag() { return (byte() & 1) != 0; }
-    // lo..hi from one byte (spans up to 256) or four.
-    int32_t range(int32_t lo, int32_t hi);
     // One byte: below 0xC0 a dimension 0..64 (the byte mod 65), else one of
     // kHugeDimensions (0xC0 + index).
     int32_t dimension();
@@ -71,12 +70,6 @@ constexpr int32_t kHugeOffsets[8] = {INT32_MIN, INT32_MAX, 100000, -100000, 1 <<
 // fuzzing stays small whatever the dimensions.
 constexpr uint64_t kMaxBytes = 1 << 17;
 
-// The size rule of qk_image.h in 128-bit arithmetic: bytes of a w x h
-// buffer, 0 for a dimension below 1, a format without rule, or a size past
-// INT32_MAX.
-uint64_t rule_bytes(int32_t width, int32_t height, uint32_t format);
-bool is_yuv420(uint32_t format);
-bool is_rgb(uint32_t format);
 // Bytes of the buffer a caller promises: the recorded size when there is
 // one, else the size rule, stretched for 4:2:0 to the chroma at a separate
 // chromaOffset (0 when the image has no rule).
@@ -131,11 +124,11 @@ private:
 // different but reproducible pixels.
 void fill(uint8_t* data, size_t bytes, uint8_t seed);
 
-// Every field of an image and the bytes of its buffer (`length` of them).
+// Every field of the frame's image and the bytes of its buffer.
 struct Snapshot {
-    explicit Snapshot(const QKImage* image, size_t length);
-    bool operator==(const Snapshot& other) const;
-    bool same_fields(const QKImage* image) const;
+    explicit Snapshot(const Frame& frame);
+    auto fields() const { return std::tie(data, width, height, format, isWrapped, size, chromaOffset); }
+    bool operator==(const Snapshot& other) const { return fields() == other.fields() && bytes == other.bytes; }
     uint8_t* data;
     int32_t width, height;
     uint32_t format, isWrapped;
@@ -144,18 +137,17 @@ struct Snapshot {
     std::vector<uint8_t> bytes;
 };
 
+// The image's claim holds (its buffer has every byte of QKImage_size, which
+// is read so that AddressSanitizer sees a claim past it) and, when `picture`,
+// that claim holds its picture.
+void check_holds(const Frame& frame, bool picture, const char* what);
+
 // What a decoding call (from memory or a file) must leave, `before` being
 // the image as it was: a failure never frees or drops the caller's buffer,
-// and one refused as too small keeps its bytes; a success leaves an image
-// whose size its buffer really holds (every claimed byte is read, so that
-// AddressSanitizer sees a claim past the buffer) and, when `decoded` (a
-// success can only be a picture), a size that holds the picture. A file
-// loaded as raw pixels keeps the size the image recorded, short or not.
+// and one refused as too small keeps its bytes; a success leaves a picture
+// that its buffer holds (a file loaded as raw pixels keeps the size the
+// image recorded, short or not, so `decoded` is false for loads).
 void check_decoded(const Frame& frame, const Snapshot& before, int32_t status, bool decoded);
-
-// Offsets in the buffer of the bytes of pixel (x, y) of a packed RGB or
-// 4:2:0 image: its own bytes, or its Y, U and V samples.
-std::vector<size_t> pixel_places(const QKImage& image, int32_t x, int32_t y);
 
 }  // namespace qkfuzz
 

@@ -19,50 +19,28 @@
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);
 
-namespace {
-
-namespace fs = std::filesystem;
-
-bool replay(const fs::path& path) {
-    std::ifstream file(path, std::ios::binary);
-    if (!file) {
-        fprintf(stderr, "replay: cannot read %s\n", path.c_str());
-        return false;
-    }
-    const std::vector<char> bytes((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
-    // A buffer of exactly the file's length, as libFuzzer gives, so that the
-    // target reading one byte too many shows under AddressSanitizer.
-    std::unique_ptr<uint8_t[]> input(new uint8_t[bytes.size()]);
-    std::copy(bytes.begin(), bytes.end(), input.get());
-    LLVMFuzzerTestOneInput(input.get(), bytes.size());
-    return true;
-}
-
-}  // namespace
-
 int main(int argc, char** argv) {
+    namespace fs = std::filesystem;
     size_t count = 0;
     bool optional = false;
     for (int i = 1; i < argc; ++i) {
         const fs::path path(argv[i]);
-        if (path == "--optional") {
-            optional = true;
-            continue;
-        }
         std::error_code error;
-        if (optional && !fs::exists(path, error)) continue;
-        if (!fs::is_directory(path, error)) {
-            if (!replay(path)) return 1;
-            ++count;
-            continue;
-        }
-        std::vector<fs::path> files;
-        for (const fs::directory_entry& entry : fs::directory_iterator(path)) {
-            if (entry.is_regular_file()) files.push_back(entry.path());
-        }
+        if (path == "--optional") optional = true;
+        if (path == "--optional" || (optional && !fs::exists(path, error))) continue;
+        std::vector<fs::path> files{path};
+        if (fs::is_directory(path, error)) files.assign(fs::directory_iterator(path), fs::directory_iterator());
         std::sort(files.begin(), files.end());
         for (const fs::path& file : files) {
-            if (!replay(file)) return 1;
+            std::ifstream in(file, std::ios::binary);
+            const std::vector<char> bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+            if (!in && !in.eof()) return fprintf(stderr, "replay: cannot read %s\n", file.c_str()), 1;
+            // A buffer of exactly the file's length, as libFuzzer gives, so
+            // that the target reading one byte too many shows under
+            // AddressSanitizer.
+            const std::unique_ptr<uint8_t[]> input(new uint8_t[bytes.size()]);
+            std::copy(bytes.begin(), bytes.end(), input.get());
+            LLVMFuzzerTestOneInput(input.get(), bytes.size());
             ++count;
         }
     }
