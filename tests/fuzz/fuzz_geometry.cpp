@@ -70,29 +70,37 @@ void rotate(Input& in) {
     check(Snapshot(frame) == after, "rotate: four quarter turns are not the identity");
 }
 
+// Runs a call from one frame into another (the same one for a drawing into
+// itself) and checks what each of these calls keeps: the source as it was,
+// the destination's fields (a destination without buffer may get one, even
+// before a refusal, as documented for crop), and after a refusal its bytes.
+// Returns the status and the destination's bytes before the call.
+template <typename Call>
+int32_t run(Frame& from, Frame& to, std::vector<uint8_t>* bytesBefore, Call call) {
+    const Snapshot srcBefore(from), dstBefore(to);
+    const int32_t status = call(from.image, to.image);
+    const Snapshot after(to);
+    const bool allocated = dstBefore.data == nullptr && after.data != nullptr;
+    check((&from == &to || Snapshot(from) == srcBefore) &&
+              (allocated ? std::tie(after.width, after.height, after.format) ==
+                               std::tie(dstBefore.width, dstBefore.height, dstBefore.format)
+                         : after.fields() == dstBefore.fields()) &&
+              (status == QK_OK || allocated || after.bytes == dstBefore.bytes),
+          "a call changed its source, the destination's fields, or after a refusal the destination");
+    if (status == QK_OK) qkfuzz::check_holds(to, true, "success into a buffer short of the picture");
+    *bytesBefore = dstBefore.bytes;
+    return status;
+}
+
 void scale(Input& in) {
     Frame from, to;
     from.make(in);
     to.make(in);
-    const QKImage* src = from.image;
-    QKImage* dst = to.image;
-    if (dst->data == nullptr && QKImage_size(dst) > qkfuzz::kMaxBytes) return;
-    const Snapshot srcBefore(from), dstBefore(to);
-    const int32_t status = QKImage_scale(src, dst);
-    check(Snapshot(from) == srcBefore, "scale changed its source");
-    const Snapshot after(to);
-    if (status != QK_OK) return check(after == dstBefore, "scale: a refusal changed the destination");
-    check(src->format == QK_FORMAT_RGBA && after.format == QK_FORMAT_RGBA && after.width == dstBefore.width &&
-              after.height == dstBefore.height && (dstBefore.data == nullptr || after.fields() == dstBefore.fields()),
-          "scale: success for a format not RGBA, or the destination's fields changed");
-    qkfuzz::check_holds(to, true, "scale: success into a buffer short of the picture");
-    const size_t bytes = 4 * size_t(dst->width) * size_t(dst->height);
-    check(srcBefore.bytes.size() >= 4 * size_t(src->width) * size_t(src->height) && after.bytes.size() >= bytes,
-          "scale: success for a picture outside its buffer");
-    // At one size, scaling copies.
-    check(src->width != dst->width || src->height != dst->height ||
-              std::equal(after.bytes.begin(), after.bytes.begin() + bytes, srcBefore.bytes.begin()),
-          "scale: a picture scaled to its own size is not a copy");
+    if (to.image->data == nullptr && QKImage_size(to.image) > qkfuzz::kMaxBytes) return;
+    std::vector<uint8_t> before;
+    const int32_t status = run(from, to, &before, QKImage_scale);
+    check(status != QK_OK || (from.image->format == QK_FORMAT_RGBA && to.image->format == QK_FORMAT_RGBA),
+          "scale: success for a format not RGBA");
 }
 
 void crop(Input& in) {
@@ -100,31 +108,19 @@ void crop(Input& in) {
     from.make(in);
     to.make(in);
     const int32_t x = in.offset(), y = in.offset();
-    const QKImage* src = from.image;
-    QKImage* dst = to.image;
+    const QKImage *src = from.image, *dst = to.image;
     if (dst->data == nullptr && QKImage_size(dst) > qkfuzz::kMaxBytes) return;
-    const Snapshot srcBefore(from), dstBefore(to);
-    const int32_t status = QKImage_crop(src, dst, x, y);
-    check(Snapshot(from) == srcBefore, "crop changed its source");
-    const Snapshot after(to);
-    // Documented: a destination without buffer may get its buffer before a
-    // refusal.
-    const bool allocated = dstBefore.data == nullptr && after.data != nullptr;
-    check(allocated ? after.isWrapped == 0 && after.width == dstBefore.width && after.height == dstBefore.height &&
-                          after.format == dstBefore.format
-                    : after.fields() == dstBefore.fields(),
-          "crop: the destination's fields changed");
-    if (status != QK_OK) return check(allocated || after.bytes == dstBefore.bytes, "crop: a refusal wrote");
+    std::vector<uint8_t> before;
+    if (run(from, to, &before, [&](const QKImage* s, QKImage* d) { return QKImage_crop(s, d, x, y); }) != QK_OK) return;
     check(src->format == dst->format && x >= 0 && y >= 0 && int64_t{x} + dst->width <= src->width &&
               int64_t{y} + dst->height <= src->height,
           "crop: success for another format or a rectangle outside the source");
-    qkfuzz::check_holds(to, true, "crop: success into a buffer short of the picture");
     if (!chroma_apart(*src) || !chroma_apart(*dst)) return;
     // Drawn back where it came from, the crop leaves the source as it was.
-    std::vector<uint8_t> copy = srcBefore.bytes;
+    std::vector<uint8_t> copy = Snapshot(from).bytes, original = copy;
     QKImage* back = QKImage_createWrap(copy.data(), src->width, src->height, src->format,
                                        static_cast<int32_t>(src->size), src->chromaOffset);
-    if (QKImage_drawImage(dst, back, x, y) == QK_OK) check(copy == srcBefore.bytes, "crop: not the source's pixels");
+    if (QKImage_drawImage(dst, back, x, y) == QK_OK) check(copy == original, "crop: not the source's pixels");
     QKImage_destroy(back);
 }
 
@@ -134,17 +130,12 @@ void draw(Input& in) {
     from.make(in);
     if (!self) to.make(in);
     const int32_t x = in.offset(), y = in.offset();
-    const QKImage* src = from.image;
     Frame& target = self ? from : to;
-    const Snapshot srcBefore(from), dstBefore(target);
-    const int32_t status = QKImage_drawImage(src, target.image, x, y);
-    if (!self) check(Snapshot(from) == srcBefore, "draw changed its source");
-    const Snapshot after(target);
-    check(after.fields() == dstBefore.fields(), "draw: the destination's fields changed");
-    if (status != QK_OK) return check(after.bytes == dstBefore.bytes, "draw: a refusal changed the destination");
-    check(after.bytes == dstBefore.bytes || srcBefore.format == dstBefore.format, "draw: wrote another format");
-    check(!self || x != 0 || y != 0 || !chroma_apart(*src) || after.bytes == dstBefore.bytes,
-          "draw: a picture drawn onto itself changed");
+    std::vector<uint8_t> before;
+    const int32_t status =
+        run(from, target, &before, [&](const QKImage* s, QKImage* d) { return QKImage_drawImage(s, d, x, y); });
+    check(status != QK_OK || Snapshot(target).bytes == before || from.image->format == target.image->format,
+          "draw: wrote another format");
 }
 
 }  // namespace

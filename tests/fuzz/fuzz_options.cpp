@@ -126,6 +126,8 @@ bool same_name(const QKOption_t* record, const char* name) {
     return record->name != nullptr && name != nullptr && strcmp(record->name, name) == 0;
 }
 
+// Registration writes no more than a new key, and a record it takes is found
+// by that key (the record itself, or an earlier one of its name and type).
 void register_record(Input& in) {
     Slot* slot = std::find_if(g_pool, g_pool + kPool, [](const Slot& s) { return !s.registered; });
     if (slot == g_pool + kPool) return;  // full: the register keeps what it has
@@ -133,40 +135,36 @@ void register_record(Input& in) {
     QKOption_t& r = slot->record;
     const QKOption_t before = r;
     const int32_t result = QKOption_RegisterNew(&r);
-    check(r.name == before.name && r.type == before.type && r.min.i == before.min.i && r.max.i == before.max.i &&
-              r.enumValues == before.enumValues && (before.key == 0 || r.key == before.key),
-          "RegisterNew wrote more than a new key");
-    if (result == 0) {
-        return check(r.name == nullptr || QKOption_FindById(r.key) != nullptr, "RegisterNew refused a free key");
-    }
-    // Registered, or given the key of an earlier record of its name and type.
     const QKOption_t* found = QKOption_FindById(r.key);
-    check(result == 1 && r.name != nullptr && found != nullptr && found->type == r.type && same_name(found, r.name),
-          "RegisterNew: a record that its key does not find");
-    if (found == &r) slot->registered = true, g_registered[r.key] = &r;
+    check(r.name == before.name && r.type == before.type && r.enumValues == before.enumValues &&
+              (before.key == 0 || r.key == before.key) &&
+              (result == 0 ? r.name == nullptr || found != nullptr
+                           : result == 1 && found != nullptr && found->type == r.type && same_name(found, r.name)),
+          "RegisterNew wrote more than a new key, refused a free one, or took a record its key does not find");
+    if (result == 1 && found == &r) slot->registered = true, g_registered[r.key] = &r;
 }
 
+// What is found by name has that name, by key that key; a registered record
+// is found by its key, and by its name unless an earlier key has the name.
 void find(Input& in) {
     const std::string name = in.text(12);
     const uint8_t flags = in.byte();
     int32_t key = static_cast<int32_t>(in.u32());
     const uint8_t pick = in.byte();
-    const QKOption_t* picked = nullptr;
-    if ((flags & 1) != 0 && !g_registered.empty()) key = (picked = registered(pick))->key;
+    const QKOption_t* picked = (flags & 1) != 0 && !g_registered.empty() ? registered(pick) : nullptr;
+    if (picked != nullptr) key = picked->key;
     const char* n = (flags & 2) != 0 ? nullptr : name.c_str();
-    const QKOption_t* byName = QKOption_FindByName(n);
-    const QKOption_t* byKey = QKOption_FindById(key);
-    check(byName == nullptr ? QKOption_FindIdByName(n) == 0
-                            : same_name(byName, n) && QKOption_FindIdByName(n) == byName->key,
-          "FindByName or FindIdByName: a record of another name");
-    check(byKey == nullptr ? QKOption_FindNameById(key) == nullptr
-                           : byKey->key == key && QKOption_FindNameById(key) == byKey->name,
-          "FindById or FindNameById: a record of another key");
-    if (picked == nullptr) return;
-    const QKOption_t* first = QKOption_FindByName(picked->name);
-    check(byKey == picked && first != nullptr && first->key <= key, "a registered record is not found");
+    const QKOption_t *byName = QKOption_FindByName(n), *byKey = QKOption_FindById(key);
+    check((byName == nullptr ? QKOption_FindIdByName(n) == 0
+                             : same_name(byName, n) && QKOption_FindIdByName(n) == byName->key) &&
+              (byKey == nullptr ? QKOption_FindNameById(key) == nullptr
+                                : byKey->key == key && QKOption_FindNameById(key) == byKey->name) &&
+              (picked == nullptr || (byKey == picked && QKOption_FindIdByName(picked->name) <= key)),
+          "Find*: a record of another name or key, or a registered record not found");
 }
 
+// Each check answers 0 or 1, 0 for a record of another type; a name of the
+// enumeration passes.
 void check_values(Input& in) {
     Slot slot;
     take_record(in, slot);
@@ -188,9 +186,8 @@ void check_values(Input& in) {
     const int32_t i = QKOption_CheckValueI(option, valueI), f = QKOption_CheckValueF(option, valueF);
     const int32_t text = QKOption_CheckValueS(option, s);
     check(i == (type == QK_OPTION_INTEGER && i == 1) && f == (type == QK_OPTION_FLOAT && f == 1) &&
-              text == (type == QK_OPTION_STRING || (type == QK_OPTION_ENUM && text == 1)),
-          "CheckValue: an answer other than 0 or 1, or 1 for another type");
-    check(!entry || s == nullptr || option == nullptr || text == 1, "CheckValueS refused a name of the enumeration");
+              text == (type == QK_OPTION_STRING || (type == QK_OPTION_ENUM && (text == 1 || (entry && s != nullptr)))),
+          "CheckValue: an answer other than 0 or 1, 1 for another type, or a name of the enumeration refused");
 }
 
 }  // namespace

@@ -1,5 +1,6 @@
 #include "fuzz/fuzz_support.h"
 
+#include <dlfcn.h>
 #include <malloc.h>
 #include <stdarg.h>
 #include <stdio.h>
@@ -8,6 +9,8 @@
 
 #include <algorithm>
 
+#include "codec/codec.h"
+#include "platform/picture.h"
 #include "qkcore/qk_log.h"
 #include "support/images.h"
 
@@ -181,6 +184,12 @@ void check_holds(const Frame& frame, bool picture, const char* what) {
     volatile uint8_t sum = 0;
     for (uint64_t i = 0; i < claimed; ++i) sum = static_cast<uint8_t>(sum + image->data[i]);
     (void)sum;
+}
+
+bool setup_decoding() {
+    quiet_log();
+    qk::platform::set_max_picture_bytes(16 << 20);
+    return dlopen(qk::kJpegModule, RTLD_NOW) != nullptr;
 }
 
 void check_decoded(const Frame& frame, const Snapshot& before, int32_t status, bool decoded) {

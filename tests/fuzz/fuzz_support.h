@@ -142,6 +142,13 @@ struct Snapshot {
 // that claim holds its picture.
 void check_holds(const Frame& frame, bool picture, const char* what);
 
+// For the decoding targets: a quiet log, pictures past 16 MB of RGBA refused
+// from their header (fuzzing stays small and fast), and the codec module held
+// open. The library loads it for each call and closes it after; held here, it
+// stays mapped for the whole run, as libFuzzer keeps the addresses of its
+// coverage counters.
+bool setup_decoding();
+
 // What a decoding call (from memory or a file) must leave, `before` being
 // the image as it was: a failure never frees or drops the caller's buffer,
 // and one refused as too small keeps its bytes; a success leaves a picture
