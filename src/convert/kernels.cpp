@@ -87,6 +87,18 @@ void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
     const ChromaStart in_chroma = chroma_start(src);
     const ChromaStart out_chroma = chroma_start(dst);
     const ptrdiff_t width = src.width;
+    // Planar luma and chroma into packed 4:2:2: each row in one pass.
+    if (in.lumaStep == 1 && out.chromaStep == 4 && (in.chromaStep == 1 || in.chromaStep == 2)) {
+        const PackRow pack = select_pack_row(in.chromaStep);
+        for (ptrdiff_t y = 0; y < src.height; ++y) {
+            const ptrdiff_t in_offset = chroma_row_offset(in, y, width);
+            const ptrdiff_t out_offset = chroma_row_offset(out, y, width);
+            pack(src.data + y * width, src.data + in_chroma.u + in_offset, src.data + in_chroma.v + in_offset,
+                 in.chromaStep, dst.data + y * width * out.lumaStep, dst.data + out_chroma.u + out_offset,
+                 dst.data + out_chroma.v + out_offset, src.width);
+        }
+        return;
+    }
     // Planar luma on both sides is one block; otherwise luma moves row by
     // row together with the chroma of the same rows, while they are cached.
     const bool block_luma = in.lumaStep == 1 && out.lumaStep == 1;

@@ -68,6 +68,15 @@ void chroma_row_reference(const uint8_t* src_u, const uint8_t* src_v, int src_st
                           int dst_step, int count);
 SampleRow select_sample_row(int src_step, int dst_step);
 ChromaRow select_chroma_row(int src_step, int dst_step);
+// Planar luma and 4:2:0 chroma (`chromaStep` 1 or 2) to one row of packed
+// 4:2:2 in one pass: luma of pixel x to dst[2x], U and V of pair j, read at
+// u[j * chromaStep] and v[j * chromaStep], to dst_u[4j] and dst_v[4j]
+// (dst + 1 and dst + 3 in either order); width is even.
+using PackRow = void (*)(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int chroma_step, uint8_t* dst,
+                         uint8_t* dst_u, uint8_t* dst_v, int width);
+void pack_row_reference(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int chroma_step, uint8_t* dst,
+                        uint8_t* dst_u, uint8_t* dst_v, int width);
+PackRow select_pack_row(int chroma_step);
 // Sets `count` U and V samples, `step` bytes apart, to `value`.
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value);
 
@@ -85,6 +94,7 @@ struct RowKernelSet {
     GreyToRgbRow (*greyToRgb)(int dst_index);
     SampleRow (*sample)(int src_step, int dst_step);
     ChromaRow (*chroma)(int src_step, int dst_step);
+    PackRow (*pack)(int chroma_step);
 };
 
 // The compiler-vectorised kernels (row_fast.cpp): baseline instructions only.

@@ -270,6 +270,12 @@ constexpr std::array<ChromaRow, sizeof...(I)> chroma_table(std::index_sequence<I
 }
 constexpr auto kChromaRows = chroma_table(std::make_index_sequence<9>());
 
+template <int ChromaStep>
+void pack_row(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int, uint8_t* dst, uint8_t* dst_u,
+              uint8_t* dst_v, int width) {
+    pack_loop(luma, u, v, ChromaStep, dst, dst_u, dst_v, width);
+}
+
 bool valid_rgb_index(int index) { return index >= 0 && index < kRgbFormatCount; }
 bool valid_luma_step(int step) { return step == 1 || step == 2; }
 
@@ -316,10 +322,14 @@ ChromaRow portable_chroma(int src_step, int dst_step) {
     return kChromaRows[src * 3 + dst];
 }
 
+PackRow portable_pack(int chroma_step) {
+    return chroma_step == 1 ? pack_row<1> : chroma_step == 2 ? pack_row<2> : pack_row_reference;
+}
+
 }  // namespace
 
 const RowKernelSet kPortableRows = {"portable",         portable_rgb_to_rgb, portable_rgb_to_luma,
                                     portable_rgb_to_chroma, portable_yuv_to_rgb, portable_grey_to_rgb,
-                                    portable_sample,    portable_chroma};
+                                    portable_sample,    portable_chroma,      portable_pack};
 
 }  // namespace qk

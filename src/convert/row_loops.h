@@ -66,6 +66,16 @@ QK_ROW_LOOP void chroma_loop(const uint8_t* src_u, const uint8_t* src_v, int src
     }
 }
 
+QK_ROW_LOOP void pack_loop(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int chroma_step, uint8_t* dst,
+                           uint8_t* dst_u, uint8_t* dst_v, ptrdiff_t width) {
+    for (ptrdiff_t j = 0; j < width / 2; ++j) {
+        dst[4 * j] = luma[2 * j];
+        dst_u[4 * j] = u[j * chroma_step];
+        dst[4 * j + 2] = luma[2 * j + 1];
+        dst_v[4 * j] = v[j * chroma_step];
+    }
+}
+
 }  // namespace qk
 
 #endif  // QKCORE_SRC_CONVERT_ROW_LOOPS_H

@@ -53,6 +53,11 @@ void chroma_row_reference(const uint8_t* src_u, const uint8_t* src_v, int src_st
     chroma_loop(src_u, src_v, src_step, dst_u, dst_v, dst_step, count);
 }
 
+void pack_row_reference(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int chroma_step, uint8_t* dst,
+                        uint8_t* dst_u, uint8_t* dst_v, int width) {
+    pack_loop(luma, u, v, chroma_step, dst, dst_u, dst_v, width);
+}
+
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value) {
     for (ptrdiff_t i = 0; i < count; ++i) u[i * step] = v[i * step] = value;
 }

@@ -68,4 +68,6 @@ ChromaRow select_chroma_row(int src_step, int dst_step) {
     return choose(&RowKernelSet::chroma, src_step, dst_step);
 }
 
+PackRow select_pack_row(int chroma_step) { return choose(&RowKernelSet::pack, chroma_step); }
+
 }  // namespace qk

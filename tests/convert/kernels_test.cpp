@@ -163,6 +163,21 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
             });
         }
     }
+    // Planar luma and 4:2:0 chroma (V first) into packed 4:2:2, U first or V
+    // first: step-2 pairs swapped or not.
+    for (int step : {1, 2}) {
+        for (int u_at : {1, 3}) {
+            all.emplace_back("pack step " + std::to_string(step) + " U at " + std::to_string(u_at),
+                             [=](const RowKernelSet* set, int w, Rows& r) {
+                                 QK_PICK(pack_row_reference, pack, step);
+                                 const int even = w / 2 * 2;
+                                 const uint8_t* luma = r.in(even);
+                                 const auto [v, u] = r.chroma(false, step, even / 2);
+                                 uint8_t* dst = r.out(size_t(even) * 2);
+                                 return kernel(luma, u, v, step, dst, dst + u_at, dst + 4 - u_at, even), true;
+                             });
+        }
+    }
     return all;
 }
 

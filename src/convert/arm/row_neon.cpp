@@ -330,16 +330,15 @@ int chroma_step_index(int step) {
 // the double path. Red and blue in 16-bit lanes: floor(1.402 v) is
 // v + (v * 26346 >> 16) and floor(1.772 u) is 2u + (u * -14942 >> 16) for
 // every u, v in [-128, 127], one doubling multiply-high each. Green is
-// floor(n / 50000) for the exact half numerator
-// n = -17207 u - 35707 v = -17207 (u + 2v) - 1293 v (two 16-bit
-// multiply-adds into 32 bits), made non-negative by 100 * 100000, divided by
-// 16 and then by 3125 through a doubling multiply-high with
-// ceil(2^31 / 3125) = 687195 (exact below 2^31 / 727, the rounding excess of
-// 687195 * 3125; the values stay below 2^20). Checked below for every pair.
-constexpr int16_t kRedHalf = 13173;   // 26346 / 2
-constexpr int16_t kBlueHalf = -7471;  // -14942 / 2
-constexpr int32_t kGreenBias = 100 * 100000;
-constexpr int32_t kDiv3125 = 687195;
+// floor((a + b) / 50000) for a = -17207 u and b = -35707 v: the quotients
+// qa = floor(a / 50000) = (u * -22560) >> 16 and
+// qb = floor(b / 50000) = ((v * 18726) >> 16) - v, plus one where the
+// remainders a - 50000 qa and b - 50000 qb (below 50000, so exact in 16-bit
+// products) add up to 50000 or more. Checked below for every pair.
+constexpr int16_t kRedHalf = 13173;      // 26346 / 2
+constexpr int16_t kBlueHalf = -7471;     // -14942 / 2
+constexpr int16_t kGreenUHalf = -11280;  // -22560 / 2
+constexpr int16_t kGreenVHalf = 9363;    // 18726 / 2
 
 constexpr int64_t floor_div(int64_t numerator, int64_t denominator) {
     const int64_t quotient = numerator / denominator;
@@ -352,11 +351,10 @@ constexpr bool integer_offsets_exact() {
     for (int u = -128; u < 128; ++u) {
         if (u + doubling_high(u, kRedHalf, 16) != floor_div(1402 * u, 1000)) return false;
         if (2 * u + doubling_high(u, kBlueHalf, 16) != floor_div(1772 * u, 1000)) return false;
+        const int64_t qa = doubling_high(u, kGreenUHalf, 16), ra = (-17207 * u - 50000 * qa) & 0xffff;
         for (int v = -128; v < 128; ++v) {
-            const int32_t half = kGreenBias - 17207 * (u + 2 * v) - 1293 * v;
-            if (doubling_high(half >> 4, kDiv3125, 32) - 200 != floor_div(-34414 * u - 71414 * v, 100000)) {
-                return false;
-            }
+            const int64_t qb = doubling_high(v, kGreenVHalf, 16) - v, rb = (-35707 * v - 50000 * qb) & 0xffff;
+            if (qa + qb + (ra >= 50000 - rb) != floor_div(-34414 * u - 71414 * v, 100000)) return false;
         }
     }
     return true;
@@ -367,17 +365,17 @@ struct Offsets {
     int16x8_t r, g, b;  // one lane per chroma pair
 };
 
-inline int16x4_t green_quotient(int32x4_t half) { return vmovn_s32(vqdmulhq_n_s32(vshrq_n_s32(half, 4), kDiv3125)); }
-
 inline Offsets chroma_offsets(uint8x8_t u_bytes, uint8x8_t v_bytes) {
     const int16x8_t u = vreinterpretq_s16_u16(vsubl_u8(u_bytes, vdup_n_u8(128)));
     const int16x8_t v = vreinterpretq_s16_u16(vsubl_u8(v_bytes, vdup_n_u8(128)));
-    const int16x8_t u2v = vaddq_s16(u, vaddq_s16(v, v));
-    const int32x4_t bias = vdupq_n_s32(kGreenBias);
-    const int32x4_t low = vmlal_n_s16(vmlal_n_s16(bias, vget_low_s16(u2v), -17207), vget_low_s16(v), -1293);
-    const int32x4_t high = vmlal_high_n_s16(vmlal_high_n_s16(bias, u2v, -17207), v, -1293);
-    const int16x8_t green = vcombine_s16(green_quotient(low), green_quotient(high));
-    return {vaddq_s16(v, vqdmulhq_n_s16(v, kRedHalf)), vsubq_s16(green, vdupq_n_s16(200)),
+    const int16x8_t qa = vqdmulhq_n_s16(u, kGreenUHalf);
+    const int16x8_t qb = vsubq_s16(vqdmulhq_n_s16(v, kGreenVHalf), v);
+    // -50000 is 15536 in 16 bits, -35707 is 29829.
+    const uint16x8_t ra = vreinterpretq_u16_s16(vmlaq_n_s16(vmulq_n_s16(u, -17207), qa, 15536));
+    const uint16x8_t rb = vreinterpretq_u16_s16(vmlaq_n_s16(vmulq_n_s16(v, 29829), qb, 15536));
+    const uint16x8_t carry = vcgeq_u16(ra, vsubq_u16(vdupq_n_u16(50000), rb));  // all ones where it carries
+    const int16x8_t green = vsubq_s16(vaddq_s16(qa, qb), vreinterpretq_s16_u16(carry));
+    return {vaddq_s16(v, vqdmulhq_n_s16(v, kRedHalf)), green,
             vaddq_s16(vaddq_s16(u, u), vqdmulhq_n_s16(u, kBlueHalf))};
 }
 
@@ -531,6 +529,38 @@ constexpr std::array<ChromaRow, sizeof...(I)> chroma_table(std::index_sequence<I
 }
 constexpr auto kChromaRows = chroma_table(std::make_index_sequence<9>());
 
+// Planar luma and 4:2:0 chroma into packed 4:2:2, 16 pixels a block: the
+// chroma pairs in the output's order beside the luma, stored interleaved.
+// Each block writes every byte of its pixels, nothing else.
+template <int Step>
+void pack_row(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int chroma_step, uint8_t* dst,
+              uint8_t* dst_u, uint8_t* dst_v, int width) {
+    ptrdiff_t x = 0;
+    if (chroma_together<Step>(u, v) && chroma_together<4>(dst_u, dst_v) && (dst_u < dst_v ? dst_u : dst_v) == dst + 1) {
+        const bool out_u_first = dst_u < dst_v;
+        // Step-2 pairs come in the source's order, swapped where the
+        // output's differs.
+        const bool swap = Step == 2 && u_first<Step>(u, v) != out_u_first;
+        const uint8_t* first = out_u_first ? u : v;
+        const uint8_t* second = out_u_first ? v : u;
+        for (; x + kBlock <= width; x += kBlock) {
+            const ptrdiff_t j = x / 2;
+            uint8x16_t pairs;
+            if constexpr (Step == 1) {
+                const uint8x8_t a = vld1_u8(first + j), b = vld1_u8(second + j);
+                pairs = vcombine_u8(vzip1_u8(a, b), vzip2_u8(a, b));
+            } else {
+                pairs = vld1q_u8((u < v ? u : v) + 2 * j);
+                if (swap) pairs = vrev16q_u8(pairs);
+            }
+            vst2q_u8(dst + 2 * x, uint8x16x2_t{{vld1q_u8(luma + x), pairs}});
+        }
+    }
+    const ptrdiff_t j = x / 2;
+    pack_row_reference(luma + x, u + j * Step, v + j * Step, chroma_step, dst + 2 * x, dst_u + 4 * j, dst_v + 4 * j,
+                       static_cast<int>(width - x));
+}
+
 // Selectors ------------------------------------------------------------------
 
 bool valid_rgb_index(int index) { return index >= 0 && index < kRgbFormatCount; }
@@ -577,9 +607,12 @@ ChromaRow neon_chroma(int src_step, int dst_step) {
     return kChromaRows[src * 3 + dst];
 }
 
+PackRow neon_pack(int chroma_step) { return chroma_step == 1 ? pack_row<1> : chroma_step == 2 ? pack_row<2> : nullptr; }
+
 }  // namespace
 
 const RowKernelSet kNeonRows = {"neon",          neon_rgb_to_rgb,  neon_rgb_to_luma, neon_rgb_to_chroma,
-                                neon_yuv_to_rgb, neon_grey_to_rgb, neon_sample,      neon_chroma};
+                                neon_yuv_to_rgb, neon_grey_to_rgb, neon_sample,      neon_chroma,
+                                neon_pack};
 
 }  // namespace qk

@@ -11,6 +11,7 @@
 #include <stdint.h>
 #include <string.h>
 
+#include <type_traits>
 #include <utility>
 
 #include "convert/row.h"
@@ -27,7 +28,6 @@ namespace {
 // the first lane's bytes to the second's, and the in-lane operations of
 // AVX2 (byte shuffles, packs, unpacks) then need no lane crossing.
 using V = __m256i;
-using F = __m256;  // single precision
 constexpr int kLanes = 2;
 
 QK_SIMD V load(const uint8_t* p, ptrdiff_t lane) {
@@ -49,6 +49,24 @@ QK_SIMD V v_broadcast(const int8_t* bytes) {
 QK_SIMD V v_and(V a, V b) { return _mm256_and_si256(a, b); }
 QK_SIMD V v_or(V a, V b) { return _mm256_or_si256(a, b); }
 QK_SIMD V v_setzero() { return _mm256_setzero_si256(); }
+// A block's 32 bytes, and 16 bytes widened to 16-bit lanes.
+QK_SIMD V load_block(const uint8_t* p) { return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(p)); }
+QK_SIMD void store_block(uint8_t* p, V value) { _mm256_storeu_si256(reinterpret_cast<__m256i*>(p), value); }
+QK_SIMD V widen_half(const uint8_t* p) {
+    return _mm256_cvtepu8_epi16(_mm_loadu_si128(reinterpret_cast<const __m128i*>(p)));
+}
+// The YUV to RGB kernels take 32 pixels of a row at a time with whole-vector
+// loads and stores. Their in-lane operations would interleave the channels
+// of pixels 0 to 15 into lane 0 and 16 to 31 into lane 1 and so split every
+// 32-byte store; with the luma's (and chroma pairs') 4-byte groups dealt
+// alternately to the lanes first, lane 0 holding pixels 0-3, 8-11, 16-19,
+// 24-27, each 32 bytes stored are consecutive pixels.
+QK_SIMD V arrange_dwords(V a) { return _mm256_permutevar8x32_epi32(a, _mm256_setr_epi32(0, 2, 4, 6, 1, 3, 5, 7)); }
+// The same for 16 packed 4:2:2 pixels, 4 to 8 bytes: lane 0 takes pixels
+// 0-3 and 8-11.
+QK_SIMD V arrange_qwords(V a) { return _mm256_permute4x64_epi64(a, 0xd8); }
+// 12 bytes of 3-byte pixels at the start of each lane to the first 24.
+QK_SIMD V join_rgb24(V a) { return _mm256_permutevar8x32_epi32(a, _mm256_setr_epi32(0, 1, 2, 4, 5, 6, 3, 7)); }
 template <int N>
 QK_SIMD V v_alignr(V high, V low) {
     return _mm256_alignr_epi8(high, low, N);
@@ -62,11 +80,15 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm256_slli_si256(a, N);
 }
 
-#define v_add_ps _mm256_add_ps
-#define v_mul_ps _mm256_mul_ps
-#define v_set1_ps _mm256_set1_ps
-#define v_cvtepi32_ps _mm256_cvtepi32_ps
-#define v_cvttps_epi32 _mm256_cvttps_epi32
+#define v_adds_epu16 _mm256_adds_epu16
+#define v_adds_epu8 _mm256_adds_epu8
+#define v_cmpeq_epi16 _mm256_cmpeq_epi16
+#define v_max_epi16 _mm256_max_epi16
+#define v_min_epi16 _mm256_min_epi16
+#define v_mullo_epi16 _mm256_mullo_epi16
+#define v_subs_epu8 _mm256_subs_epu8
+#define v_unpackhi_epi64 _mm256_unpackhi_epi64
+#define v_unpacklo_epi64 _mm256_unpacklo_epi64
 #define v_add_epi16 _mm256_add_epi16
 #define v_add_epi32 _mm256_add_epi32
 #define v_cmpeq_epi8 _mm256_cmpeq_epi8
@@ -80,6 +102,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
 #define v_set1_epi32 _mm256_set1_epi32
 #define v_set1_epi8 _mm256_set1_epi8
 #define v_shuffle_epi8 _mm256_shuffle_epi8
+#define v_slli_epi16 _mm256_slli_epi16
 #define v_slli_epi32 _mm256_slli_epi32
 #define v_slli_epi64 _mm256_slli_epi64
 #define v_srai_epi32 _mm256_srai_epi32
@@ -98,6 +121,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
 }  // namespace
 
 const RowKernelSet kAvx2Rows = {"avx2",          simd_rgb_to_rgb,  simd_rgb_to_luma, simd_rgb_to_chroma,
-                                simd_yuv_to_rgb, simd_grey_to_rgb, simd_sample,      simd_chroma};
+                                simd_yuv_to_rgb, simd_grey_to_rgb, simd_sample,      simd_chroma,
+                                simd_pack};
 
 }  // namespace qk

@@ -11,6 +11,7 @@
 #include <stdint.h>
 #include <string.h>
 
+#include <type_traits>
 #include <utility>
 
 #include "convert/row.h"
@@ -25,7 +26,6 @@ namespace {
 // One 128-bit lane: a block of 16 pixels a step. The kernels name their
 // operations v_*, which row_avx2.cpp maps to two lanes.
 using V = __m128i;
-using F = __m128;  // single precision
 constexpr int kLanes = 1;
 
 QK_SIMD V load(const uint8_t* p, ptrdiff_t) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
@@ -36,6 +36,15 @@ QK_SIMD V v_broadcast(const int8_t* bytes) { return _mm_loadu_si128(reinterpret_
 QK_SIMD V v_and(V a, V b) { return _mm_and_si128(a, b); }
 QK_SIMD V v_or(V a, V b) { return _mm_or_si128(a, b); }
 QK_SIMD V v_setzero() { return _mm_setzero_si128(); }
+// A block's 16 bytes, and 8 bytes widened to 16-bit lanes.
+QK_SIMD V load_block(const uint8_t* p) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
+QK_SIMD void store_block(uint8_t* p, V value) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), value); }
+QK_SIMD V widen_half(const uint8_t* p) { return _mm_unpacklo_epi8(load_half(p, 0), _mm_setzero_si128()); }
+// With one lane, the order the in-lane operations see is the order in
+// memory (see row_avx2.cpp).
+QK_SIMD V arrange_dwords(V a) { return a; }
+QK_SIMD V arrange_qwords(V a) { return a; }
+QK_SIMD V join_rgb24(V a) { return a; }
 template <int N>
 QK_SIMD V v_alignr(V high, V low) {
     return _mm_alignr_epi8(high, low, N);
@@ -49,11 +58,15 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm_slli_si128(a, N);
 }
 
-#define v_add_ps _mm_add_ps
-#define v_mul_ps _mm_mul_ps
-#define v_set1_ps _mm_set1_ps
-#define v_cvtepi32_ps _mm_cvtepi32_ps
-#define v_cvttps_epi32 _mm_cvttps_epi32
+#define v_adds_epu16 _mm_adds_epu16
+#define v_adds_epu8 _mm_adds_epu8
+#define v_cmpeq_epi16 _mm_cmpeq_epi16
+#define v_max_epi16 _mm_max_epi16
+#define v_min_epi16 _mm_min_epi16
+#define v_mullo_epi16 _mm_mullo_epi16
+#define v_subs_epu8 _mm_subs_epu8
+#define v_unpackhi_epi64 _mm_unpackhi_epi64
+#define v_unpacklo_epi64 _mm_unpacklo_epi64
 #define v_add_epi16 _mm_add_epi16
 #define v_add_epi32 _mm_add_epi32
 #define v_cmpeq_epi8 _mm_cmpeq_epi8
@@ -67,6 +80,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
 #define v_set1_epi32 _mm_set1_epi32
 #define v_set1_epi8 _mm_set1_epi8
 #define v_shuffle_epi8 _mm_shuffle_epi8
+#define v_slli_epi16 _mm_slli_epi16
 #define v_slli_epi32 _mm_slli_epi32
 #define v_slli_epi64 _mm_slli_epi64
 #define v_srai_epi32 _mm_srai_epi32
@@ -85,6 +99,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
 }  // namespace
 
 const RowKernelSet kSsse3Rows = {"ssse3",         simd_rgb_to_rgb,  simd_rgb_to_luma, simd_rgb_to_chroma,
-                                 simd_yuv_to_rgb, simd_grey_to_rgb, simd_sample,      simd_chroma};
+                                 simd_yuv_to_rgb, simd_grey_to_rgb, simd_sample,      simd_chroma,
+                                simd_pack};
 
 }  // namespace qk
