@@ -104,8 +104,9 @@ const Operation kOperations[] = {
          return libyuv::RGB24ToARGB(s, w * 3, d, w * 4, w, h);
      }},
     // A quarter turn counter-clockwise (libyuv's kRotate270). Ours turns the
-    // frame in place, with a scratch buffer of its own, NV12 through RGBA
-    // tiles back into NV12; libyuv writes a second buffer, NV12 into I420
+    // frame in place, with a scratch buffer of its own: NV12's planes turned,
+    // half of their rows into it, then converted through two RGBA rows at a
+    // time back into NV12; libyuv writes a second buffer, NV12 into I420
     // planes.
     {"rgba_rotate_90", Kind::kRotate, QK_FORMAT_RGBA, QK_FORMAT_RGBA, 1, 1,
      [](const uint8_t* s, int w, int h, uint8_t* d, int, int) {

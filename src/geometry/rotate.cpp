@@ -6,6 +6,7 @@
 #include <algorithm>
 
 #include "convert/row.h"
+#include "geometry/plane_turn.h"
 #include "image/checks.h"
 #include "image/format.h"
 #include "platform/memory.h"
@@ -58,24 +59,28 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
     return QK_OK;
 }
 
-// ---- 4:2:0 images: through RGBA, one tile at a time ----
-
-// Output tiles are kTile x kTile pixels at most: their two RGBA copies (the
-// source region as it lies, and turned) stay in the second-level cache, and
-// rows of 128 pixels leave the row kernels short tails only.
-constexpr int32_t kTile = 128;
+// ---- 4:2:0 images: planes turned, then the RGBA round trip row by row ----
 
 // Turns a 4:2:0 image with the bytes that converting it to RGBA, turning
-// that and converting back would give, without the frame-sized RGBA copy:
-// the RGBA of a pixel depends on its own luma and chroma pair only, and the
-// chroma written back is that of the top-left pixel of each 2x2 block, so
-// each output tile is made from the source region it shows, converted with
-// the row kernels of QKImage_convert, turned, and converted back. The
-// dimensions are even, so the turn covers every pixel. The turned planes
-// take the place of the source's in the caller's buffer, which is why the
-// source is read from a copy of its planes: a plane cannot be turned onto
-// itself tile by tile without overwriting what later tiles read, and the
-// copy takes 1.5 bytes a pixel where the RGBA frame took 4.
+// that and converting back would give, without the frame-sized RGBA copy.
+// The RGBA of a pixel depends on its own luma and the chroma pair of its
+// 2x2 block only, and with even dimensions a turn maps 2x2 blocks onto 2x2
+// blocks: so the planes are turned first, as they are (the chroma planes as
+// planes of half the size), and each output pixel then sits over the luma
+// and chroma of the pixel it shows. Converting the turned planes to RGBA
+// gives the turned RGBA frame, two rows at a time, and converting those rows
+// back writes what the RGBA road writes, in its order: the luma of an even
+// row, the chroma of its 2x2 blocks (from their top-left pixels, as the
+// RGBA road takes them), the luma of the odd row.
+//
+// The planes turn within the caller's buffer, but for the bottom half of a
+// quarter turn's rows (a plane cannot take a quarter turn onto itself
+// without overwriting what is still to be read), which go to scratch memory
+// and are converted from there; each converted row pair reads only itself.
+// The top half is turned into place band by band, each band converted
+// right after.
+// Chroma lying inside the luma plane is turned wholly into scratch memory
+// instead, so that the conversion reads only what the RGBA road read.
 int32_t rotate_yuv420(QKImage* image, int32_t angle) {
     const int32_t width = image->width;
     const int32_t height = image->height;
@@ -88,73 +93,98 @@ int32_t rotate_yuv420(QKImage* image, int32_t angle) {
     const bool exchanged = orient % 2 == 1;
     const int32_t out_width = exchanged ? height : width;
     const int32_t out_height = exchanged ? width : height;
-
-    const size_t luma_bytes = qk::yuv420_luma_bytes(width, height);
-    const size_t chroma_bytes = qk::yuv420_chroma_bytes(width, height);
-    // One block: the copy of the planes, then the two RGBA tiles.
-    constexpr size_t kTileBytes = size_t{kTile} * kTile * qk::platform::kBitmapBytesPerPixel;
-    uint8_t* const source =
-        static_cast<uint8_t*>(qk::platform::allocate_pixels(luma_bytes + chroma_bytes + 2 * kTileBytes));
-    if (source == nullptr) return QK_FAIL(QK_ERROR_ALLOC_FAILED);
-    uint8_t* const region = source + luma_bytes + chroma_bytes;
-    uint8_t* const turned_tile = region + kTileBytes;
-    memcpy(source, image->data, luma_bytes);
-    memcpy(source + luma_bytes, image->data + qk::chroma_base(*image), chroma_bytes);
-
-    const qk::YuvLayout& layout = qk::yuv_layout(image->format);
-    const ptrdiff_t step = layout.chromaStep;
-    const qk::ChromaStart in = qk::chroma_start(image->format, luma_bytes, width, height);
-    const qk::ChromaStart out = qk::chroma_start(
-        image->format, qk::chroma_base(image->chromaOffset, out_width, out_height), out_width, out_height);
-    const int rgba = qk::rgb_format_index(QK_FORMAT_RGBA);
-    const qk::YuvToRgbShape to_rgb_shape{1, layout.chromaStep, 2, qk::kFormats[rgba].rgb};
-    const qk::RgbToYuvShape to_yuv_shape{qk::kFormats[rgba].rgb, 1, layout.chromaStep};
-    const qk::YuvToRgbRow to_rgb = qk::select_yuv_to_rgb_row(rgba, 1, layout.chromaStep, 2);
-    const qk::RgbToLumaRow to_luma = qk::select_rgb_to_luma_row(rgba, 1);
-    const qk::RgbToChromaRow to_chroma = qk::select_rgb_to_chroma_row(rgba, layout.chromaStep);
-    // The raster layer turns clockwise.
-    const int quarter_turns = -orient;
+    // No pixels (a dimension below 1, which the checks above let through):
+    // no bytes to turn, only the dimensions.
+    if (width < 1 || height < 1) {
+        image->width = out_width;
+        image->height = out_height;
+        return QK_OK;
+    }
 
     uint8_t* const data = image->data;
-    for (int32_t r0 = 0; r0 < out_height; r0 += kTile) {
-        const int32_t rows = std::min(kTile, out_height - r0);
-        for (int32_t c0 = 0; c0 < out_width; c0 += kTile) {
-            const int32_t cols = std::min(kTile, out_width - c0);
-            // The source rectangle [x0, x0 + region_width) x [y0, y0 + region_height)
-            // that output columns [c0, c0 + cols) of rows [r0, r0 + rows) show.
-            int32_t x0 = c0, y0 = r0;
-            switch (orient) {
-                case 1: x0 = width - r0 - rows, y0 = c0; break;
-                case 2: x0 = width - c0 - cols, y0 = height - r0 - rows; break;
-                case 3: x0 = r0, y0 = height - c0 - cols; break;
-            }
-            const int32_t region_width = exchanged ? rows : cols;
-            const int32_t region_height = exchanged ? cols : rows;
-            const size_t region_row_bytes = static_cast<size_t>(region_width) * qk::platform::kBitmapBytesPerPixel;
-            for (int32_t y = 0; y < region_height; y += 2) {
-                const uint8_t* luma = source + static_cast<ptrdiff_t>(y0 + y) * width + x0;
-                const ptrdiff_t offset = ((y0 + y) / 2 * static_cast<ptrdiff_t>(width / 2) + x0 / 2) * step;
-                uint8_t* pixels = region + y * region_row_bytes;
-                to_rgb(luma, luma + width, source + in.u + offset, source + in.v + offset, pixels,
-                       pixels + region_row_bytes, region_width, to_rgb_shape);
-            }
-            const uint8_t* tile = region;
-            const size_t tile_row_bytes = static_cast<size_t>(cols) * qk::platform::kBitmapBytesPerPixel;
-            if (orient != 0) {
-                qk::platform::turn_copy(region, region_row_bytes, region_width, region_height, quarter_turns,
-                                        turned_tile, tile_row_bytes);
-                tile = turned_tile;
-            }
-            for (int32_t r = 0; r < rows; ++r) {
-                const uint8_t* pixels = tile + r * tile_row_bytes;
-                to_luma(pixels, data + static_cast<ptrdiff_t>(r0 + r) * out_width + c0, cols, to_yuv_shape);
-                if (r % 2 != 0) continue;
-                const ptrdiff_t offset = ((r0 + r) / 2 * static_cast<ptrdiff_t>(out_width / 2) + c0 / 2) * step;
-                to_chroma(pixels, data + out.u + offset, data + out.v + offset, cols / 2, to_yuv_shape);
-            }
+    const uint64_t base = qk::chroma_base(*image);
+    const size_t luma_bytes = qk::yuv420_luma_bytes(width, height);
+    const size_t plane_bytes = qk::yuv420_chroma_bytes(width, height) / 2;
+    const bool in_place = base >= luma_bytes;
+    // Output rows [0, top) are turned in place, the others into scratch
+    // memory; top is even, so that chroma rows split at top / 2.
+    const int32_t top = !in_place ? 0 : exchanged ? out_height / 4 * 2 : out_height;
+    const size_t rest_luma_bytes = static_cast<size_t>(out_height - top) * out_width;
+    const size_t rest_plane_bytes = rest_luma_bytes / 4;
+    const size_t rgba_row_bytes = static_cast<size_t>(out_width) * qk::platform::kBitmapBytesPerPixel;
+    // One block: the rest of the turned luma, of the turned chroma, and two
+    // RGBA rows.
+    const size_t scratch_bytes = rest_luma_bytes + 2 * rest_plane_bytes + 2 * rgba_row_bytes;
+    uint8_t* const rest = static_cast<uint8_t*>(qk::platform::allocate_pixels(scratch_bytes));
+    if (rest == nullptr) return QK_FAIL(QK_ERROR_ALLOC_FAILED);
+    uint8_t* const rest_chroma = rest + rest_luma_bytes;
+    uint8_t* const even = rest_chroma + 2 * rest_plane_bytes;
+    uint8_t* const odd = even + rgba_row_bytes;
+
+    // Chroma pairs turn as one plane of 2-byte elements, separate U and V
+    // planes one after the other.
+    const qk::YuvLayout& layout = qk::yuv_layout(image->format);
+    const int step = layout.chromaStep;
+    const int chroma_planes = step == 2 ? 1 : 2;
+    uint8_t* const chroma_plane[2] = {data + base, data + base + plane_bytes};
+    if (!in_place) {
+        qk::turn_plane(data, width, width, height, 1, orient, rest, out_width);
+        for (int p = 0; p < chroma_planes; ++p) {
+            qk::turn_plane(chroma_plane[p], width / 2 * step, width / 2, height / 2, step, orient,
+                           rest_chroma + p * rest_plane_bytes, out_width / 2 * step);
+        }
+    } else {
+        // A half turn's row in `even`.
+        qk::turn_plane_in_place(data, width, height, 1, orient, top, exchanged ? rest : even);
+        for (int p = 0; p < chroma_planes; ++p) {
+            qk::turn_plane_in_place(chroma_plane[p], width / 2, height / 2, step, orient, top / 2,
+                                    exchanged ? rest_chroma + p * rest_plane_bytes : even);
         }
     }
-    free(source);
+
+    const int rgba = qk::rgb_format_index(QK_FORMAT_RGBA);
+    const qk::YuvToRgbShape to_rgb_shape{1, step, 2, qk::kFormats[rgba].rgb};
+    const qk::RgbToYuvShape to_yuv_shape{qk::kFormats[rgba].rgb, 1, step};
+    const qk::YuvToRgbRow to_rgb = qk::select_yuv_to_rgb_row(rgba, 1, step, 2);
+    const qk::RgbToLumaRow to_luma = qk::select_rgb_to_luma_row(rgba, 1);
+    const qk::RgbToChromaRow to_chroma = qk::select_rgb_to_chroma_row(rgba, step);
+    // U and V of the output, in place and in the scratch memory: a plane and
+    // the offset in it (that of the sample in its pair).
+    const qk::ChromaStart out = qk::chroma_start(image->format, base, out_width, out_height);
+    auto rest_at = [&](uint64_t at) {
+        const uint64_t offset = at - base;
+        return rest_chroma + (step == 2 ? offset : offset / plane_bytes * rest_plane_bytes);
+    };
+    const uint8_t* const rest_u = rest_at(out.u);
+    const uint8_t* const rest_v = rest_at(out.v);
+    const ptrdiff_t chroma_row_bytes = static_cast<ptrdiff_t>(out_width / 2) * step;
+    // Rows turned in place by a quarter turn come in bands, each converted
+    // while the cache still holds it; as many rows as the plane turn's tiles
+    // have source columns, so that each band reads whole tiles.
+    constexpr int32_t kBand = 256;
+    for (int32_t r0 = 0; r0 < out_height; r0 += kBand) {
+        const int32_t r1 = std::min(r0 + kBand, out_height);
+        if (exchanged && r0 < top) {
+            const int32_t r1_top = std::min(r1, top);
+            qk::turn_gathered_rows(data, width, height, 1, orient, top, r0, r1_top);
+            for (int p = 0; p < chroma_planes; ++p) {
+                qk::turn_gathered_rows(chroma_plane[p], width / 2, height / 2, step, orient, top / 2, r0 / 2,
+                                       r1_top / 2);
+            }
+        }
+        for (ptrdiff_t r = r0; r < r1; r += 2) {
+            const ptrdiff_t offset = r / 2 * chroma_row_bytes;
+            const ptrdiff_t rest_offset = (r - top) / 2 * chroma_row_bytes;
+            const uint8_t* luma = r < top ? data + r * out_width : rest + (r - top) * out_width;
+            const uint8_t* u = r < top ? data + out.u + offset : rest_u + rest_offset;
+            const uint8_t* v = r < top ? data + out.v + offset : rest_v + rest_offset;
+            to_rgb(luma, luma + out_width, u, v, even, odd, out_width, to_rgb_shape);
+            to_luma(even, data + r * out_width, out_width, to_yuv_shape);
+            to_chroma(even, data + out.u + offset, data + out.v + offset, out_width / 2, to_yuv_shape);
+            to_luma(odd, data + (r + 1) * out_width, out_width, to_yuv_shape);
+        }
+    }
+    free(rest);
     image->width = out_width;
     image->height = out_height;
     return QK_OK;

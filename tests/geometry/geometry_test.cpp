@@ -3,6 +3,7 @@
 #include <stdint.h>
 #include <string.h>
 
+#include <algorithm>
 #include <random>
 #include <string>
 #include <vector>
@@ -59,21 +60,27 @@ TEST(Rotate, EveryAngleMapsEveryPixel) {
 
 // Other formats turn through RGBA: exactly converting, turning the RGBA copy
 // and converting back into the same buffer. 4:2:0 images get those bytes
-// tile by tile: sizes of one tile, several (64 pixels a side) and not a
-// multiple of it, chroma right after the luma or further on in a larger
-// buffer (bytes in between untouched), every angle, 0 included (a round trip).
+// from their planes turned (the top half of a quarter turn in place, in
+// bands of 256 rows): sizes of whole vector blocks of the plane turns and
+// not (2x2 to 290x98, past one tile of 64 rows and 256 columns; 530 wide
+// turns into two bands), chroma right after the luma, further on in a
+// larger buffer (bytes in between untouched) or inside the luma plane (gap
+// < 0: the RGBA road's order of writes decides), every angle, 0 included
+// (a round trip).
 TEST(Rotate, OtherFormatsThroughRgba) {
-    const struct { uint32_t format; int32_t w, h; uint32_t gap; } cases[] = {
+    const struct { uint32_t format; int32_t w, h, gap; } cases[] = {
         {QK_FORMAT_NV21, 16, 8, 0},   {QK_FORMAT_NV12, 130, 66, 0},  {QK_FORMAT_YV12, 64, 192, 0},
         {QK_FORMAT_YUVP, 6, 258, 0},  {QK_FORMAT_NV12, 2, 2, 0},     {QK_FORMAT_NV21, 200, 130, 40},
         {QK_FORMAT_YV12, 34, 12, 6},  {QK_FORMAT_YUVP, 128, 66, 64}, {QK_FORMAT_YUYV, 6, 4, 0},
+        {QK_FORMAT_NV12, 290, 98, 0}, {QK_FORMAT_YV12, 530, 36, 0},  {QK_FORMAT_NV21, 20, 12, -100},
     };
     std::mt19937 random(7);
     for (const auto& c : cases) {
         for (int32_t angle : {0, 90, 180, 270, -90}) {
             SCOPED_TRACE(::testing::Message() << fourcc(c.format) << " " << c.w << "x" << c.h << " gap " << c.gap
                                               << " by " << angle);
-            const size_t luma = size_t(c.w) * c.h, bytes = QKImage_requiredSize(c.w, c.h, c.format) + c.gap;
+            const size_t luma = size_t(c.w) * c.h;
+            const size_t bytes = QKImage_requiredSize(c.w, c.h, c.format) + std::max(c.gap, 0);
             const uint32_t chroma = c.gap != 0 ? uint32_t(luma + c.gap) : 0;
             Frame image({c.format, c.w, c.h, bytes, bytes, chroma}), expected({c.format, c.w, c.h, bytes, bytes, chroma});
             image.randomize(random);
