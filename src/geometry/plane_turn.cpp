@@ -117,12 +117,12 @@ void transpose(const uint8_t* src, ptrdiff_t src_stride, uint8_t* dst, ptrdiff_t
                int32_t height) {
 #if defined(QK_PLANE_TURN_VECTORS)
     constexpr int32_t n = kBlock<E>;
-    constexpr int32_t tile_rows = 64 / E, tile_cols = 256 / E;
+    constexpr ptrdiff_t tile_rows = 64 / E, tile_cols = 256 / E;
     const int32_t block_width = width - width % n, block_height = height - height % n;
-    for (int32_t y0 = 0; y0 < block_height; y0 += tile_rows) {
-        const int32_t y1 = std::min(y0 + tile_rows, block_height);
-        for (int32_t x0 = 0; x0 < block_width; x0 += tile_cols) {
-            const int32_t x1 = std::min(x0 + tile_cols, block_width);
+    for (ptrdiff_t y0 = 0; y0 < block_height; y0 += tile_rows) {
+        const ptrdiff_t y1 = std::min<ptrdiff_t>(y0 + tile_rows, block_height);
+        for (ptrdiff_t x0 = 0; x0 < block_width; x0 += tile_cols) {
+            const ptrdiff_t x1 = std::min<ptrdiff_t>(x0 + tile_cols, block_width);
             for (ptrdiff_t y = y0; y < y1; y += n) {
                 for (ptrdiff_t x = x0; x < x1; x += n) {
                     transpose_block<E>(src + y * src_stride + x * E, src_stride, dst + x * dst_stride + y * E,

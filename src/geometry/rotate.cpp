@@ -79,6 +79,7 @@ int32_t rotate_rgba(QKImage* image, int32_t angle) {
 // and are converted from there; each converted row pair reads only itself.
 // The top half is turned into place band by band, each band converted
 // right after.
+//
 // Chroma lying inside the luma plane is turned wholly into scratch memory
 // instead, so that the conversion reads only what the RGBA road read.
 int32_t rotate_yuv420(QKImage* image, int32_t angle) {
@@ -161,14 +162,15 @@ int32_t rotate_yuv420(QKImage* image, int32_t angle) {
     // Rows turned in place by a quarter turn come in bands, each converted
     // while the cache still holds it; as many rows as the plane turn's tiles
     // have source columns, so that each band reads whole tiles.
-    constexpr int32_t kBand = 256;
-    for (int32_t r0 = 0; r0 < out_height; r0 += kBand) {
-        const int32_t r1 = std::min(r0 + kBand, out_height);
+    constexpr int64_t kBand = 256;
+    for (int64_t r0 = 0; r0 < out_height; r0 += kBand) {
+        const int64_t r1 = std::min<int64_t>(r0 + kBand, out_height);
         if (exchanged && r0 < top) {
-            const int32_t r1_top = std::min(r1, top);
-            qk::turn_gathered_rows(data, width, height, 1, orient, top, r0, r1_top);
+            const int32_t r1_top = static_cast<int32_t>(std::min<int64_t>(r1, top));
+            const int32_t r0_top = static_cast<int32_t>(r0);
+            qk::turn_gathered_rows(data, width, height, 1, orient, top, r0_top, r1_top);
             for (int p = 0; p < chroma_planes; ++p) {
-                qk::turn_gathered_rows(chroma_plane[p], width / 2, height / 2, step, orient, top / 2, r0 / 2,
+                qk::turn_gathered_rows(chroma_plane[p], width / 2, height / 2, step, orient, top / 2, r0_top / 2,
                                        r1_top / 2);
             }
         }
