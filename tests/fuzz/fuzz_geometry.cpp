@@ -22,10 +22,7 @@
 
 namespace {
 
-using qkfuzz::check;
-using qkfuzz::Frame;
-using qkfuzz::Input;
-using qkfuzz::Snapshot;
+using namespace qkfuzz;
 
 // A byte mod 4: 0 a multiple -12..12 of 90 (byte mod 25 - 12); 1 one of
 // kAngles (byte mod 8); 2 a raw 32-bit value; 3 90 times a signed 16-bit value.

@@ -25,11 +25,7 @@
 
 namespace {
 
-using qkfuzz::check;
-using qkfuzz::check_holds;
-using qkfuzz::Frame;
-using qkfuzz::Input;
-using qkfuzz::Snapshot;
+using namespace qkfuzz;
 using qktest::is_yuv420;
 
 bool convertible(uint32_t format) {

@@ -28,8 +28,7 @@
 
 namespace {
 
-using qkfuzz::check;
-using qkfuzz::Input;
+using namespace qkfuzz;
 
 // Where the value of the first item "name=..." of the string starts, or null:
 // the first ",name=" of the string with a comma put in front.

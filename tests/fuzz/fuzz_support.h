@@ -139,7 +139,8 @@ struct Snapshot {
 
 // The image's claim holds (its buffer has every byte of QKImage_size, which
 // is read so that AddressSanitizer sees a claim past it) and, when `picture`,
-// that claim holds its picture.
+// that claim covers its picture (the size rule, or for 4:2:0 chroma at an
+// offset of its own the luma plane and the chroma wherever it lies).
 void check_holds(const Frame& frame, bool picture, const char* what);
 
 // For the decoding targets: a quiet log, pictures past 16 MB of RGBA refused
