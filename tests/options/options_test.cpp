@@ -109,8 +109,7 @@ TEST(OptionRegister, KeysDuplicatesAndLookups) {
 
 // Integers and floats: both bounds 0 take every value (-0 counting as 0),
 // otherwise min <= value <= max, and NaN fails. Enumerations: a name of the
-// list before its end. Each check passes only records of its own type
-// (strings take anything).
+// list before its end; none without list, or from entries without names.
 TEST(OptionValues, EachCheckOnItsOwnType) {
     constexpr uint32_t I = QK_OPTION_INTEGER, F = QK_OPTION_FLOAT;
     const struct { uint32_t type; QKOptionBound_t min, max; double value; int32_t passes; } ranges[] = {
@@ -133,15 +132,11 @@ TEST(OptionValues, EachCheckOnItsOwnType) {
     for (const char* value : {"ON", "of", "", "never read", static_cast<const char*>(nullptr)}) {
         EXPECT_EQ(QKOption_CheckValueS(&choice, value), 0) << (value ? value : "(null)");
     }
-    QKOption_t integer = {0, "i", QK_OPTION_INTEGER, 0, 0, nullptr}, real = {0, "f", QK_OPTION_FLOAT, 0, 0, nullptr};
-    QKOption_t text = {0, "s", QK_OPTION_STRING, 0, 0, nullptr}, invalid = {0, "x", 9, 0, 0, modes};
-    QKOption_t no_list = {0, "e", QK_OPTION_ENUM, 0, 0, nullptr}, no_names = {0, "e", QK_OPTION_ENUM, 0, 0, empty},
-               unnamed_only = {0, "e", QK_OPTION_ENUM, 0, 0, unnamed};
-    for (const QKOption_t* option : {&integer, &real, &choice, &text, &invalid, &no_list, &no_names, &unnamed_only,
-                                     static_cast<QKOption_t*>(nullptr)}) {
-        EXPECT_EQ(QKOption_CheckValueI(option, 0), option == &integer ? 1 : 0);
-        EXPECT_EQ(QKOption_CheckValueF(option, 0.0f), option == &real ? 1 : 0);
-        EXPECT_EQ(QKOption_CheckValueS(option, "auto"), option == &choice || option == &text ? 1 : 0);
+    // Which type each check takes, null records included, the fuzz target
+    // holds on every record it makes; these lists are what it never makes.
+    for (const QKOptionEnum_t* list : {static_cast<const QKOptionEnum_t*>(nullptr), empty, unnamed}) {
+        const QKOption_t option = {0, "e", QK_OPTION_ENUM, 0, 0, list};
+        EXPECT_EQ(QKOption_CheckValueS(&option, "auto"), 0);
     }
 }
 
