@@ -48,6 +48,7 @@ QK_SIMD V v_broadcast(const int8_t* bytes) {
 }
 QK_SIMD V v_and(V a, V b) { return _mm256_and_si256(a, b); }
 QK_SIMD V v_or(V a, V b) { return _mm256_or_si256(a, b); }
+QK_SIMD V v_xor(V a, V b) { return _mm256_xor_si256(a, b); }
 QK_SIMD V v_setzero() { return _mm256_setzero_si256(); }
 // A block's 32 bytes, and 16 bytes widened to 16-bit lanes.
 QK_SIMD V load_block(const uint8_t* p) { return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(p)); }
@@ -105,6 +106,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
 #define v_slli_epi16 _mm256_slli_epi16
 #define v_slli_epi32 _mm256_slli_epi32
 #define v_slli_epi64 _mm256_slli_epi64
+#define v_srai_epi16 _mm256_srai_epi16
 #define v_srai_epi32 _mm256_srai_epi32
 #define v_srli_epi16 _mm256_srli_epi16
 #define v_srli_epi32 _mm256_srli_epi32

@@ -35,6 +35,7 @@ QK_SIMD V load_half(const uint8_t* p, ptrdiff_t) { return _mm_loadl_epi64(reinte
 QK_SIMD V v_broadcast(const int8_t* bytes) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(bytes)); }
 QK_SIMD V v_and(V a, V b) { return _mm_and_si128(a, b); }
 QK_SIMD V v_or(V a, V b) { return _mm_or_si128(a, b); }
+QK_SIMD V v_xor(V a, V b) { return _mm_xor_si128(a, b); }
 QK_SIMD V v_setzero() { return _mm_setzero_si128(); }
 // A block's 16 bytes, and 8 bytes widened to 16-bit lanes.
 QK_SIMD V load_block(const uint8_t* p) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
@@ -83,6 +84,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
 #define v_slli_epi16 _mm_slli_epi16
 #define v_slli_epi32 _mm_slli_epi32
 #define v_slli_epi64 _mm_slli_epi64
+#define v_srai_epi16 _mm_srai_epi16
 #define v_srai_epi32 _mm_srai_epi32
 #define v_srli_epi16 _mm_srli_epi16
 #define v_srli_epi32 _mm_srli_epi32
