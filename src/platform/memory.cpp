@@ -40,11 +40,11 @@ void populate(void* memory, size_t bytes) {
 
 }  // namespace
 
-void* allocate_pixels(size_t bytes, bool cleared) {
+void* allocate_pixels(size_t bytes, bool cleared, bool map_in) {
     void* memory = cleared ? calloc(bytes, 1) : malloc(bytes);
     if (memory != nullptr && bytes >= kFrameSized) {
         hint_large_pages(memory, bytes);
-        populate(memory, bytes);
+        if (map_in) populate(memory, bytes);
     }
     return memory;
 }

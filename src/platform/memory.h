@@ -7,12 +7,22 @@
 #define QKCORE_SRC_PLATFORM_MEMORY_H
 
 #include <stddef.h>
+#include <stdint.h>
 
 namespace qk::platform {
 
 // `bytes` of uninitialised memory, or zeroed when `cleared`; null when memory
-// runs out. Release with free().
-void* allocate_pixels(size_t bytes, bool cleared = false);
+// runs out. Release with free(). Without `map_in`, pages arrive as they are
+// first written, for a decoder whose data may run out long before the
+// picture it claims does.
+void* allocate_pixels(size_t bytes, bool cleared = false, bool map_in = true);
+
+// Whether a decoder should have `bytes` of pixels mapped in at once for a
+// picture coded in `encoded_bytes`. Camera frames compress 10 to 50 times
+// and flat pictures some hundreds; a stream thousands of times shorter than
+// the picture its header claims is damaged, and decoding it then costs the
+// pages written before its data runs out, not the whole claim.
+inline bool worth_mapping_in(uint64_t bytes, uint64_t encoded_bytes) { return bytes / 4096 <= encoded_bytes; }
 
 }  // namespace qk::platform
 

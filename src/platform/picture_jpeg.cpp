@@ -14,6 +14,7 @@
 #include <jpeglib.h>
 
 #include "platform/picture.h"
+#include "platform/memory.h"
 #include "platform/picture_formats.h"
 
 namespace qk::platform {
@@ -77,7 +78,8 @@ bool run(JpegDecode& d, const uint8_t* data, size_t size, Bitmap& bitmap) {
     }
     cinfo->out_color_space = JCS_EXT_RGBA;
     jpeg_start_decompress(cinfo);
-    if (!bitmap.allocate(cinfo->output_width, cinfo->output_height, /*cleared=*/false)) {
+    if (!bitmap.allocate(cinfo->output_width, cinfo->output_height, /*cleared=*/false,
+                         worth_mapping_in(uint64_t{kBitmapBytesPerPixel} * cinfo->output_width * cinfo->output_height, size))) {
         jump_out(reinterpret_cast<j_common_ptr>(cinfo));
     }
     while (cinfo->output_scanline < cinfo->output_height) {

@@ -12,6 +12,7 @@
 #include <zlib.h>
 
 #include "platform/picture.h"
+#include "platform/memory.h"
 #include "platform/picture_formats.h"
 
 namespace qk::platform {
@@ -101,7 +102,8 @@ bool decode_png(const uint8_t* data, size_t size, Bitmap& bitmap) {
         spng_set_png_buffer(ctx.get(), data, size) != 0 || spng_get_ihdr(ctx.get(), &ihdr) != 0 ||
         !picture_size_allowed(ihdr.width, ihdr.height) ||
         spng_decoded_image_size(ctx.get(), SPNG_FMT_RGBA8, &bytes) != 0 ||
-        !bitmap.allocate(static_cast<int32_t>(ihdr.width), static_cast<int32_t>(ihdr.height), /*cleared=*/false)) {
+        !bitmap.allocate(static_cast<int32_t>(ihdr.width), static_cast<int32_t>(ihdr.height), /*cleared=*/false,
+                         worth_mapping_in(bytes, size))) {
         return false;
     }
     // 16-bit samples come out as their high bytes; gamma stays as stored. The

@@ -2,6 +2,7 @@
 // output is unpremultiplied already).
 #include <webp/decode.h>
 
+#include "platform/memory.h"
 #include "platform/picture_formats.h"
 
 namespace qk::platform {
@@ -14,7 +15,10 @@ bool decode_webp(const uint8_t* data, size_t size, Bitmap& bitmap) {
         !picture_size_allowed(features.width, features.height)) {
         return false;
     }
-    if (!bitmap.allocate(features.width, features.height, /*cleared=*/false)) return false;
+    if (!bitmap.allocate(features.width, features.height, /*cleared=*/false,
+                         worth_mapping_in(uint64_t{kBitmapBytesPerPixel} * features.width * features.height, size))) {
+        return false;
+    }
     if (WebPDecodeRGBAInto(data, size, bitmap.pixels(), bitmap.byte_count(), static_cast<int>(bitmap.row_bytes())) ==
         nullptr) {
         bitmap.release();

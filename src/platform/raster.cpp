@@ -473,12 +473,12 @@ bool Bitmap::borrow(uint8_t* pixels, int32_t width, int32_t height) {
     return true;
 }
 
-bool Bitmap::allocate(int32_t width, int32_t height, bool cleared) {
+bool Bitmap::allocate(int32_t width, int32_t height, bool cleared, bool map_in) {
     release();
     if (width < 1 || height < 1) return false;
     const uint64_t bytes = uint64_t{kBitmapBytesPerPixel} * static_cast<uint64_t>(width) * static_cast<uint64_t>(height);
     if (bytes > kMaxBitmapBytes) return false;
-    void* memory = allocate_pixels(bytes, cleared);
+    void* memory = allocate_pixels(bytes, cleared, map_in);
     if (memory == nullptr) return false;
     pixels_ = static_cast<uint8_t*>(memory);
     width_ = width;

@@ -33,7 +33,8 @@ public:
     // `cleared` (cheaper than clearing afterwards: fresh memory comes zeroed).
     // False, and no pixels, for a dimension below 1, a size past the signed
     // 32-bit byte counts of the library, or memory that cannot be had.
-    bool allocate(int32_t width, int32_t height, bool cleared);
+    // `map_in` as for allocate_pixels.
+    bool allocate(int32_t width, int32_t height, bool cleared, bool map_in = true);
     // Forgets the pixels, freeing them when owned.
     void release();
 

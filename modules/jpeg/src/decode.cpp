@@ -81,8 +81,10 @@ extern "C" __attribute__((visibility("default"))) void* fastJpegDecode(const voi
     const uint64_t bytes = QKImage_requiredSize(w, h, format);
     if (bytes == 0) return nullptr;
     // The library's pixel memory: frame-sized blocks are mapped in with one
-    // system call rather than a page fault at a time while decoding.
-    Block out(static_cast<uint8_t*>(qk::platform::allocate_pixels(bytes)));
+    // system call rather than a page fault at a time while decoding, unless
+    // the stream is far too short for the picture it claims.
+    Block out(static_cast<uint8_t*>(
+        qk::platform::allocate_pixels(bytes, false, qk::platform::worth_mapping_in(bytes, size))));
     if (!out) return nullptr;
 
     const bool decoded = yuv420 ? decode_420(handle.get(), stream, size, w, h, format, out.get(), bytes)
