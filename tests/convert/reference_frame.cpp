@@ -4,6 +4,8 @@
 
 #include <algorithm>
 
+#include "support/images.h"
+
 namespace qktest {
 
 const uint32_t kConvertibleFormats[13] = {
@@ -37,25 +39,6 @@ RgbPlaces rgb_places(uint32_t format) {
 }
 
 bool packed(uint32_t format) { return format == QK_FORMAT_YUYV || format == QK_FORMAT_YVYU; }
-
-// Places of the U and V bytes that cover pixel (x, y) of a width x height
-// image whose 4:2:0 chroma starts at `base`; false for GREY.
-bool chroma_places(uint32_t format, size_t width, size_t height, size_t base, size_t x, size_t y, size_t* u,
-                   size_t* v) {
-    const size_t semiPlanar = base + (y / 2) * width + (x / 2) * 2;
-    const size_t planar = base + (y / 2) * (width / 2) + x / 2;
-    const size_t quarter = width * height / 4;
-    const size_t pair = (y * width + x / 2 * 2) * 2;
-    switch (format) {
-        case QK_FORMAT_NV12: *u = semiPlanar, *v = semiPlanar + 1; return true;
-        case QK_FORMAT_NV21: *v = semiPlanar, *u = semiPlanar + 1; return true;
-        case QK_FORMAT_YV12: *v = planar, *u = planar + quarter; return true;
-        case QK_FORMAT_YUVP: *u = planar, *v = planar + quarter; return true;
-        case QK_FORMAT_YUYV: *u = pair + 1, *v = pair + 3; return true;
-        case QK_FORMAT_YVYU: *v = pair + 1, *u = pair + 3; return true;
-        default: return false;
-    }
-}
 
 }  // namespace
 

@@ -149,22 +149,12 @@ TEST(Scale, NearestPixelUnderTheCentre) {
 // What pixel (x, y) of a packed RGB or 4:2:0 image holds: its own bytes, or
 // its Y, U and V samples, addressed from the image's chroma base.
 std::vector<uint8_t> pixel_bytes(const QKImage& image, int32_t x, int32_t y) {
-    const size_t w = static_cast<size_t>(image.width);
-    if (!is_yuv420(image.format)) {
-        const size_t bpp = QKImage_requiredSize(1, 1, image.format);
-        return std::vector<uint8_t>(image.data + (y * w + x) * bpp, image.data + (y * w + x + 1) * bpp);
-    }
-    const uint8_t* d = image.data + (image.chromaOffset != 0 ? image.chromaOffset : w * image.height);
-    const size_t quarter = w * image.height / 4;
-    const size_t pair = (y / 2) * w + (x / 2) * 2;   // NV12, NV21: U,V pairs in rows of w bytes
-    const size_t plane = (y / 2) * (w / 2) + x / 2;  // YV12, YUVP: planes with rows of w / 2 bytes
-    const uint8_t luma = image.data[y * w + x];
-    switch (image.format) {
-        case QK_FORMAT_NV12: return {luma, d[pair], d[pair + 1]};
-        case QK_FORMAT_NV21: return {luma, d[pair + 1], d[pair]};
-        case QK_FORMAT_YV12: return {luma, d[quarter + plane], d[plane]};
-        default: return {luma, d[plane], d[quarter + plane]};  // YUVP
-    }
+    const size_t w = static_cast<size_t>(image.width), at = y * w + x, bpp = QKImage_requiredSize(1, 1, image.format);
+    if (!is_yuv420(image.format)) return std::vector<uint8_t>(image.data + at * bpp, image.data + (at + 1) * bpp);
+    size_t u = 0, v = 0;
+    chroma_places(image.format, w, image.height, image.chromaOffset != 0 ? image.chromaOffset : w * image.height, x, y,
+                  &u, &v);
+    return {image.data[at], image.data[u], image.data[v]};
 }
 
 // Crop cuts the destination's rectangle out of the source at (x, y); draw

@@ -34,6 +34,26 @@ inline bool is_yuv420(uint32_t f) {
     return f == QK_FORMAT_NV12 || f == QK_FORMAT_NV21 || f == QK_FORMAT_YV12 || f == QK_FORMAT_YUVP;
 }
 
+// Places of the U and V bytes that cover pixel (x, y) of a width x height
+// image whose 4:2:0 chroma starts at `base` (packed 4:2:2 too); false for
+// formats without chroma.
+inline bool chroma_places(uint32_t format, size_t width, size_t height, size_t base, size_t x, size_t y, size_t* u,
+                          size_t* v) {
+    const size_t semiPlanar = base + (y / 2) * width + (x / 2) * 2;
+    const size_t planar = base + (y / 2) * (width / 2) + x / 2;
+    const size_t quarter = width * height / 4;
+    const size_t pair = (y * width + x / 2 * 2) * 2;
+    switch (format) {
+        case QK_FORMAT_NV12: *u = semiPlanar, *v = semiPlanar + 1; return true;
+        case QK_FORMAT_NV21: *v = semiPlanar, *u = semiPlanar + 1; return true;
+        case QK_FORMAT_YV12: *v = planar, *u = planar + quarter; return true;
+        case QK_FORMAT_YUVP: *u = planar, *v = planar + quarter; return true;
+        case QK_FORMAT_YUYV: *u = pair + 1, *v = pair + 3; return true;
+        case QK_FORMAT_YVYU: *v = pair + 1, *u = pair + 3; return true;
+        default: return false;
+    }
+}
+
 // Byte i becomes (i * 37 + seed) mod 256: every byte of 256 differs.
 inline void fill_distinct(uint8_t* bytes, size_t count, uint8_t seed = 11) {
     for (size_t i = 0; i < count; ++i) bytes[i] = static_cast<uint8_t>(i * 37 + seed);
