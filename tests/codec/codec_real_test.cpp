@@ -84,14 +84,11 @@ ImagePtr picture(int32_t w, int32_t h, uint32_t format) {
 // plane anywhere shows. Camera formats keep their sampling.
 TEST(JpegModule, EveryFormatDecodesIntoEveryTarget) {
     ImagePtr rgba = picture(64, 48, QK_FORMAT_RGBA);
-    const uint32_t formats[] = {QK_FORMAT_RGBA, QK_FORMAT_BGRA, QK_FORMAT_ARGB, QK_FORMAT_ABGR, QK_FORMAT_RGB8,
-                                QK_FORMAT_BGR8, QK_FORMAT_GREY, QK_FORMAT_NV12, QK_FORMAT_NV21, QK_FORMAT_YV12,
-                                QK_FORMAT_YUVP, QK_FORMAT_YUYV, QK_FORMAT_YVYU};
-    for (uint32_t from : formats) {
+    for (uint32_t from : kConvertibleFormats) {
         const Bytes stream = encode(converted(*rgba, from), 64, 48, from);
         const int sub = sampling(stream);
         EXPECT_EQ(sub, from == QK_FORMAT_GREY ? 0 : is_422(from) ? 0x21 : 0x22) << fourcc(from);
-        for (uint32_t to : formats) {
+        for (uint32_t to : kConvertibleFormats) {
             int w = -1, h = -1;
             const Bytes out = decode(stream, to, &w, &h), expected = converted(*rgba, to);
             const std::string pair = fourcc(from) + " into " + fourcc(to);

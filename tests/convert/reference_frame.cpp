@@ -8,11 +8,6 @@
 
 namespace qktest {
 
-const uint32_t kConvertibleFormats[13] = {
-    QK_FORMAT_RGBA, QK_FORMAT_BGRA, QK_FORMAT_ARGB, QK_FORMAT_ABGR, QK_FORMAT_RGB8, QK_FORMAT_BGR8, QK_FORMAT_GREY,
-    QK_FORMAT_YUYV, QK_FORMAT_YVYU, QK_FORMAT_NV12, QK_FORMAT_NV21, QK_FORMAT_YV12, QK_FORMAT_YUVP,
-};
-
 namespace {
 
 // RGB family (the first six formats): the letters of the code are the byte

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "qkcore/qk_image.h"
+#include "support/images.h"
 
 namespace qktest {
 
@@ -34,9 +35,6 @@ inline Rgb formula_yuv_to_rgb(int luma, int u_byte, int v_byte) {
     return {clamp255(static_cast<int>(y + rv)), clamp255(static_cast<int>((y - gu) - gv)),
             clamp255(static_cast<int>(y + bu))};
 }
-
-// The formats that convert to each other.
-extern const uint32_t kConvertibleFormats[13];
 
 // The bytes `dst` must hold after converting `src` into it: `dst`'s current
 // buffer (its first `capacity` bytes) with every byte the conversion defines

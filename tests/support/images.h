@@ -30,6 +30,11 @@ inline std::string fourcc(uint32_t code, bool padded = false) {
     return padded ? std::string(4 - name.size(), ' ') + name : name;
 }
 
+// The formats that convert to each other.
+constexpr uint32_t kConvertibleFormats[13] = {
+    QK_FORMAT_RGBA, QK_FORMAT_BGRA, QK_FORMAT_ARGB, QK_FORMAT_ABGR, QK_FORMAT_RGB8, QK_FORMAT_BGR8, QK_FORMAT_GREY,
+    QK_FORMAT_YUYV, QK_FORMAT_YVYU, QK_FORMAT_NV12, QK_FORMAT_NV21, QK_FORMAT_YV12, QK_FORMAT_YUVP};
+
 inline bool is_yuv420(uint32_t f) {
     return f == QK_FORMAT_NV12 || f == QK_FORMAT_NV21 || f == QK_FORMAT_YV12 || f == QK_FORMAT_YUVP;
 }
