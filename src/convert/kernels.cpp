@@ -99,6 +99,25 @@ void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
         }
         return;
     }
+    // Packed 4:2:2 into semi-planar 4:2:0: the rows that carry chroma in one
+    // pass over the packed row, the others their luma only.
+    if (in.lumaStep == 2 && in.chromaStep == 4 && out.lumaStep == 1 && out.chromaStep == 2) {
+        const UnpackRow unpack = select_unpack_row();
+        const SampleRow luma = select_sample_row(2, 1);
+        for (ptrdiff_t y = 0; y < src.height; ++y) {
+            const uint8_t* in_row = src.data + y * width * 2;
+            uint8_t* out_luma = dst.data + y * width;
+            if (row_carries_chroma(out, y)) {
+                const ptrdiff_t in_offset = chroma_row_offset(in, y, width);
+                const ptrdiff_t out_offset = chroma_row_offset(out, y, width);
+                unpack(in_row, src.data + in_chroma.u + in_offset, src.data + in_chroma.v + in_offset, out_luma,
+                       dst.data + out_chroma.u + out_offset, dst.data + out_chroma.v + out_offset, src.width);
+            } else {
+                luma(in_row, 2, out_luma, 1, src.width);
+            }
+        }
+        return;
+    }
     // Planar luma on both sides is one block; otherwise luma moves row by
     // row together with the chroma of the same rows, while they are cached.
     const bool block_luma = in.lumaStep == 1 && out.lumaStep == 1;

@@ -77,6 +77,15 @@ using PackRow = void (*)(const uint8_t* luma, const uint8_t* u, const uint8_t* v
 void pack_row_reference(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int chroma_step, uint8_t* dst,
                         uint8_t* dst_u, uint8_t* dst_v, int width);
 PackRow select_pack_row(int chroma_step);
+// One row of packed 4:2:2 (luma of pixel x at src[2x], U and V of pair j at
+// src_u[4j] and src_v[4j], src + 1 and src + 3 in either order) to planar
+// luma and a row of chroma pairs (U at u[2j], V at v[2j], next to each other
+// in either order), in one pass; width is even.
+using UnpackRow = void (*)(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma, uint8_t* u,
+                           uint8_t* v, int width);
+void unpack_row_reference(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma, uint8_t* u,
+                          uint8_t* v, int width);
+UnpackRow select_unpack_row();
 // Sets `count` U and V samples, `step` bytes apart, to `value`.
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value);
 
@@ -95,6 +104,7 @@ struct RowKernelSet {
     SampleRow (*sample)(int src_step, int dst_step);
     ChromaRow (*chroma)(int src_step, int dst_step);
     PackRow (*pack)(int chroma_step);
+    UnpackRow (*unpack)();
 };
 
 // The compiler-vectorised kernels (row_fast.cpp): baseline instructions only.

@@ -322,6 +322,12 @@ ChromaRow portable_chroma(int src_step, int dst_step) {
     return kChromaRows[src * 3 + dst];
 }
 
+void unpack_row(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma, uint8_t* u, uint8_t* v,
+                int width) {
+    unpack_loop(src, src_u, src_v, luma, u, v, width);
+}
+UnpackRow portable_unpack() { return unpack_row; }
+
 PackRow portable_pack(int chroma_step) {
     return chroma_step == 1 ? pack_row<1> : chroma_step == 2 ? pack_row<2> : pack_row_reference;
 }
@@ -330,6 +336,7 @@ PackRow portable_pack(int chroma_step) {
 
 const RowKernelSet kPortableRows = {"portable",         portable_rgb_to_rgb, portable_rgb_to_luma,
                                     portable_rgb_to_chroma, portable_yuv_to_rgb, portable_grey_to_rgb,
-                                    portable_sample,    portable_chroma,      portable_pack};
+                                    portable_sample,    portable_chroma,      portable_pack,
+                                    portable_unpack};
 
 }  // namespace qk

@@ -76,6 +76,16 @@ QK_ROW_LOOP void pack_loop(const uint8_t* luma, const uint8_t* u, const uint8_t*
     }
 }
 
+QK_ROW_LOOP void unpack_loop(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma,
+                             uint8_t* u, uint8_t* v, ptrdiff_t width) {
+    for (ptrdiff_t j = 0; j < width / 2; ++j) {
+        luma[2 * j] = src[4 * j];
+        luma[2 * j + 1] = src[4 * j + 2];
+        u[2 * j] = src_u[4 * j];
+        v[2 * j] = src_v[4 * j];
+    }
+}
+
 }  // namespace qk
 
 #endif  // QKCORE_SRC_CONVERT_ROW_LOOPS_H

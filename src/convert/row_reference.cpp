@@ -58,6 +58,11 @@ void pack_row_reference(const uint8_t* luma, const uint8_t* u, const uint8_t* v,
     pack_loop(luma, u, v, chroma_step, dst, dst_u, dst_v, width);
 }
 
+void unpack_row_reference(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma, uint8_t* u,
+                          uint8_t* v, int width) {
+    unpack_loop(src, src_u, src_v, luma, u, v, width);
+}
+
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value) {
     for (ptrdiff_t i = 0; i < count; ++i) u[i * step] = v[i * step] = value;
 }

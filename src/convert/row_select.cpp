@@ -69,5 +69,6 @@ ChromaRow select_chroma_row(int src_step, int dst_step) {
 }
 
 PackRow select_pack_row(int chroma_step) { return choose(&RowKernelSet::pack, chroma_step); }
+UnpackRow select_unpack_row() { return choose(&RowKernelSet::unpack); }
 
 }  // namespace qk

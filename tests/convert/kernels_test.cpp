@@ -178,6 +178,18 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
                              });
         }
     }
+    // Packed 4:2:2 (U at byte 1 or 3) into luma and V-first pairs.
+    for (int u_at : {1, 3}) {
+        all.emplace_back("unpack U at " + std::to_string(u_at), [=](const RowKernelSet* set, int w, Rows& r) {
+            const UnpackRow kernel = pick<UnpackRow>(set, unpack_row_reference, &RowKernelSet::unpack);
+            if (kernel == nullptr) return false;
+            const int even = w / 2 * 2;
+            const uint8_t* src = r.in(size_t(even) * 2);
+            uint8_t* luma = r.out(even);
+            const auto [v, u] = r.chroma(true, 2, even / 2);
+            return kernel(src, src + u_at, src + 4 - u_at, luma, u, v, even), true;
+        });
+    }
     return all;
 }
 

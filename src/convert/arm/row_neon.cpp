@@ -607,12 +607,33 @@ ChromaRow neon_chroma(int src_step, int dst_step) {
     return kChromaRows[src * 3 + dst];
 }
 
+// Packed 4:2:2 into planar luma and a row of chroma pairs, 32 pixels a
+// block: the four bytes of each pixel pair de-interleaved and stored as luma
+// and as pairs, in the output's order.
+void unpack_row(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma, uint8_t* u, uint8_t* v,
+                int width) {
+    ptrdiff_t x = 0;
+    const uint8_t* src_first = src_u < src_v ? src_u : src_v;
+    if (chroma_together<4>(src_u, src_v) && src_first == src + 1 && chroma_together<2>(u, v)) {
+        // Bytes 1 and 3 of each source pair: U first or V first.
+        const int first = u < v ? (src_u < src_v ? 1 : 3) : (src_u < src_v ? 3 : 1);
+        for (constexpr int kPixels = 2 * kBlock; x + kPixels <= width; x += kPixels) {
+            const uint8x16x4_t in = vld4q_u8(src + 2 * x);
+            vst2q_u8(luma + x, uint8x16x2_t{{in.val[0], in.val[2]}});
+            vst2q_u8((u < v ? u : v) + x, uint8x16x2_t{{in.val[first], in.val[4 - first]}});
+        }
+    }
+    unpack_row_reference(src + 2 * x, src_u + 2 * x, src_v + 2 * x, luma + x, u + x, v + x,
+                         static_cast<int>(width - x));
+}
+UnpackRow neon_unpack() { return unpack_row; }
+
 PackRow neon_pack(int chroma_step) { return chroma_step == 1 ? pack_row<1> : chroma_step == 2 ? pack_row<2> : nullptr; }
 
 }  // namespace
 
 const RowKernelSet kNeonRows = {"neon",          neon_rgb_to_rgb,  neon_rgb_to_luma, neon_rgb_to_chroma,
                                 neon_yuv_to_rgb, neon_grey_to_rgb, neon_sample,      neon_chroma,
-                                neon_pack};
+                                neon_pack,       neon_unpack};
 
 }  // namespace qk

@@ -102,6 +102,6 @@ QK_SIMD V v_shift_left_bytes(V a) {
 
 const RowKernelSet kSsse3Rows = {"ssse3",         simd_rgb_to_rgb,  simd_rgb_to_luma, simd_rgb_to_chroma,
                                  simd_yuv_to_rgb, simd_grey_to_rgb, simd_sample,      simd_chroma,
-                                simd_pack};
+                                simd_pack,   simd_unpack};
 
 }  // namespace qk
