@@ -21,13 +21,11 @@ uint32_t point_count(const QKImage& image) {
     return count;
 }
 
+// Each convertible format's rule is held by the every-pair conversion test
+// (its buffers, measured apart), D16's by the same-format copies.
 TEST(SizeRule, BytesPerFormat) {
     const struct { int32_t width, height; uint32_t format; uint64_t bytes; } cases[] = {
-        {16, 8, QK_FORMAT_RGBA, 512}, {16, 8, QK_FORMAT_BGRA, 512}, {16, 8, QK_FORMAT_ARGB, 512},
-        {16, 8, QK_FORMAT_ABGR, 512}, {16, 8, QK_FORMAT_RGB8, 384}, {16, 8, QK_FORMAT_BGR8, 384},
-        {16, 8, QK_FORMAT_GREY, 128}, {16, 8, QK_FORMAT_YUYV, 256}, {16, 8, QK_FORMAT_YVYU, 256},
-        {16, 8, QK_FORMAT_D16, 256},  {16, 8, QK_FORMAT_NV12, 192}, {16, 8, QK_FORMAT_NV21, 192},
-        {16, 8, QK_FORMAT_YV12, 192}, {16, 8, QK_FORMAT_YUVP, 192}, {2, 2, QK_FORMAT_PCL, 100},
+        {16, 8, QK_FORMAT_NV12, 192}, {2, 2, QK_FORMAT_PCL, 100},
         // 4:2:0 of an odd pixel count rounds half a byte up.
         {3, 3, QK_FORMAT_NV12, 14}, {1, 1, QK_FORMAT_NV21, 2}, {5, 1, QK_FORMAT_YV12, 8},
         // No size: bad dimensions, no size rule, or past the signed 32-bit
@@ -39,8 +37,7 @@ TEST(SizeRule, BytesPerFormat) {
         {32768, 16384, QK_FORMAT_RGBA, 0},  // exactly 2^31
         {INT32_MAX, INT32_MAX, QK_FORMAT_PCL, 0}, {INT32_MAX, 1, QK_FORMAT_NV12, 0},
         {1 << 30, 1 << 30, QK_FORMAT_PCL, 0},  // 16 x 2^60 + 36 wraps to 36 in 64 bits
-        {INT32_MAX, 1, QK_FORMAT_GREY, INT32_MAX}, {8192, 8191, QK_FORMAT_RGBA, 268402688},
-    };
+        {INT32_MAX, 1, QK_FORMAT_GREY, INT32_MAX}, {8192, 8191, QK_FORMAT_RGBA, 268402688}};
     for (const auto& c : cases) {
         EXPECT_EQ(QKImage_requiredSize(c.width, c.height, c.format), c.bytes) << c.width << "x" << c.height;
     }
@@ -126,8 +123,7 @@ TEST(Image, RefusalsReportOnceAndChangeNothing) {
         {allocate, 1, QK_FORMAT_PCL, 1, 3, QK_ERROR_INVALID_SIZE},           // no room for the point count
         {wrap_byte, 0, QK_FORMAT_NV12, 4, 0, NUL},
         {wrap_nothing, 2, QK_FORMAT_NV12, 4, 0, NUL},
-        {wrap_own, 2, QK_FORMAT_NV12, 4, 0, PARAM},
-    };
+        {wrap_own, 2, QK_FORMAT_NV12, 4, 0, PARAM}};
     for (const auto& c : cases) {
         ImagePtr image(c.image == 0   ? nullptr
                        : c.image == 1 ? QKImage_createEmpty(c.width, 1, c.format)
@@ -171,7 +167,7 @@ TEST(Image, CloneGathersTheImageWithinBothBuffers) {
     for (const QKImage* source : {bare.get(), jpeg.get(), static_cast<QKImage*>(nullptr)}) {
         EXPECT_EQ(QKImage_clone(source), nullptr);
     }
-    EXPECT_TRUE(HasNoErrors(log));
+    EXPECT_EQ(log.texts(4), std::vector<std::string>());
     ImagePtr header(QKImage_cloneHeader(jpeg.get()));
     EXPECT_EQ(std::make_tuple(header->data, header->width, header->format),
               std::make_tuple(static_cast<uint8_t*>(nullptr), 10, QK_FORMAT_JPEG));
