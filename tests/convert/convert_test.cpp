@@ -48,8 +48,7 @@ TEST(Convert, RefusalsLeaveTheDestinationsBytesAsTheyWere) {
         {"D16 to GREY", {D16, 4, 2, 256}, {GREY, 2, 2, 256, 256}, NONE},
         {"PCL to RGBA", {PCL, 4, 2, 256}, {RGBA, 2, 2, 256, 256}, NONE},
         {"RGBA to D16", {RGBA, 4, 2, 256}, {D16, 2, 2, 256, 256}, NONE},
-        {"JPEG to NV12", {JPEG, 4, 2, 256, 100}, {NV12, 2, 2, 256, 256}, NONE},
-    };
+        {"JPEG to NV12", {JPEG, 4, 2, 256, 100}, {NV12, 2, 2, 256, 256}, NONE}};
     auto name = [](const ImageSpec& s) {
         return std::to_string(s.width) + "x" + std::to_string(s.height) + " " + fourcc(s.format, true);
     };
@@ -93,8 +92,7 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
         {{NV12, 16, 8, 400, 400}, {NV12, 16, 8, 400, 400, 128}, {{0, 0, 128}, {128, 128, 64}}},
         {{YV12, 16, 8, 364, 0, 300}, {YV12, 16, 8, 370, 370, 300}, {{0, 0, 128}, {300, 300, 64}}},
         // Chroma inside the luma plane: the source holds 128 bytes, not the rule's 192.
-        {{NV12, 16, 8, 128, 128, 32}, {NV12, 16, 8, 200, 0, 32}, {{0, 0, 128}, {32, 32, 64}}},
-    };
+        {{NV12, 16, 8, 128, 128, 32}, {NV12, 16, 8, 200, 0, 32}, {{0, 0, 128}, {32, 32, 64}}}};
     std::mt19937 random(7);
     for (const auto& c : cases) {
         Frame src(c.src), dst(c.dst, 200);
@@ -103,7 +101,7 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
         for (const Block& b : c.blocks) std::copy_n(src.buffer.begin() + b.srcAt, b.length, expected.begin() + b.dstAt);
         LogCapture log;
         EXPECT_EQ(QKImage_convert(&src.image, &dst.image), QK_OK);
-        EXPECT_TRUE(HasNoErrors(log));
+        EXPECT_EQ(log.texts(4), std::vector<std::string>());
         EXPECT_EQ(dst.buffer, expected) << &c - cases;
         const std::vector<uint8_t> own = dst.buffer;  // converted into itself: unchanged
         EXPECT_EQ(QKImage_convert(&dst.image, &dst.image), QK_OK);

@@ -71,9 +71,4 @@ bool LogCapture::contains(int level, const std::string& text) const {
                                          << "LINE\", log was: " << ::testing::PrintToString(log.lines());
 }
 
-::testing::AssertionResult HasNoErrors(const LogCapture& log) {
-    if (log.texts(4).empty()) return ::testing::AssertionSuccess();
-    return ::testing::AssertionFailure() << "unexpected errors: " << ::testing::PrintToString(log.lines());
-}
-
 }  // namespace qktest

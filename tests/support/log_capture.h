@@ -40,8 +40,6 @@ private:
 // Succeeds when the capture holds exactly one failure report, for `status`,
 // whose place is `file` (relative to the repository root) and a line number.
 ::testing::AssertionResult HasOneFailureReport(const LogCapture& log, int32_t status, const char* file);
-// Succeeds when the capture holds no level-4 line at all.
-::testing::AssertionResult HasNoErrors(const LogCapture& log);
 
 }  // namespace qktest
 
