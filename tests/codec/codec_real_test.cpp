@@ -199,8 +199,7 @@ TEST(Picture, DecodesEachFormatWithinTheLimit) {
         {"png palette+tRNS", png_of(2, 1, SPNG_COLOR_TYPE_INDEXED, {0, 1}), {10, 20, 30, 128, 200, 100, 50, 255}, 2, 0},
         {"webp lossless", webp_of(translucent, 2, 2), translucent, 2, 0},
         {"gif interlaced", gif_of(4, 8, 1, 2, 3, 6, true), screen, 4, 0},
-        {"gif", gif_of(4, 8, 1, 2, 3, 6), screen, 4, 0},
-    };
+        {"gif", gif_of(4, 8, 1, 2, 3, 6), screen, 4, 0}};
     for (const auto& c : cases) {
         qk::platform::Bitmap bitmap;
         qk::platform::set_max_picture_bytes(c.expected.size() - 1);
@@ -230,8 +229,7 @@ TEST(Picture, BadPicturesAreRefusedAndLeaveTheTarget) {
         {"jpeg cut short", Bytes(jpeg.begin(), jpeg.end() - 8)}, {"jpeg 65500x65500", huge(jpeg)},
         {"webp cut short", Bytes(webp.begin(), webp.end() - 8)}, {"gif cut short", Bytes(gif.begin(), gif.end() - 6)},
         {"gif 65535x65535", gif_of(65535, 65535, 0, 0, 4, 4)}, {"gif frame off the screen", gif_of(4, 4, 2, 0, 4, 4)},
-        {"gif index past the map", gif_of(4, 4, 0, 0, 4, 4, false, 2)}, {"too small", jpeg, QK_ERROR_INVALID_SIZE},
-    };
+        {"gif index past the map", gif_of(4, 4, 0, 0, 4, 4, false, 2)}, {"too small", jpeg, QK_ERROR_INVALID_SIZE}};
     testing::internal::CaptureStderr();
     for (const auto& c : cases) {
         const bool yuyv = c.status == QK_ERROR_INVALID_SIZE;

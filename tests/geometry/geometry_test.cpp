@@ -72,8 +72,7 @@ TEST(Rotate, OtherFormatsThroughRgba) {
         {QK_FORMAT_NV21, 16, 8, 0},   {QK_FORMAT_NV12, 130, 66, 0},  {QK_FORMAT_YV12, 64, 192, 0},
         {QK_FORMAT_YUVP, 6, 258, 0},  {QK_FORMAT_NV12, 2, 2, 0},     {QK_FORMAT_NV21, 200, 130, 40},
         {QK_FORMAT_YV12, 34, 12, 6},  {QK_FORMAT_YUVP, 128, 66, 64}, {QK_FORMAT_YUYV, 6, 4, 0},
-        {QK_FORMAT_NV12, 290, 98, 0}, {QK_FORMAT_YV12, 530, 36, 0},  {QK_FORMAT_NV21, 20, 12, -100},
-    };
+        {QK_FORMAT_NV12, 290, 98, 0}, {QK_FORMAT_YV12, 530, 36, 0},  {QK_FORMAT_NV21, 20, 12, -100}};
     std::mt19937 random(7);
     for (const auto& c : cases) {
         for (int32_t angle : {0, 90, 180, 270, -90}) {
@@ -158,8 +157,7 @@ TEST(CropAndDraw, MovePixelsBetweenImagesOfOneFormat) {
         {true, 8, 8, 3, 8, 5, 0, 0, 0},     {false, 6, 8, 8, 4, 0, 0, 56, 0},   {false, 6, 8, 8, 4, 2, 0, 56, 40},
         {false, 6, 8, 8, 4, -2, -2, 56, 0}, {false, 6, 8, 8, 4, 4, -4, 0, 40},  {false, 6, 8, 8, 4, -4, 2, 56, 40},
         {false, 6, 8, 8, 4, 6, 2, 0, 0},    {false, 6, 8, 8, 4, 0, -4, 56, 40}, {false, 6, 8, 8, 4, 1, -1, 0, 0},
-        {false, 6, 8, 8, 4, -3, 1, 0, 0},   {false, 6, 8, 8, 4, 7, 3, 0, 0},
-    };
+        {false, 6, 8, 8, 4, -3, 1, 0, 0},   {false, 6, 8, 8, 4, 7, 3, 0, 0}};
     for (uint32_t format : {QK_FORMAT_RGBA, QK_FORMAT_RGB8, QK_FORMAT_NV12, QK_FORMAT_NV21, QK_FORMAT_YV12,
                             QK_FORMAT_YUVP}) {
         const bool yuv = is_yuv420(format);
@@ -284,8 +282,7 @@ TEST(GeometryRefusals, ReportOnceAndLeaveTheImagesAlone) {
         {kDraw, {NV12, 2, 2}, {NV12, 4, 4}, 1, 0, NONE, nullptr, "Unsupported dimensions for YUV420: 2x2 offset 1,0"},
         {kDraw, {NV12, 3, 2}, {NV12, 4, 4}, 0, -2, NONE, nullptr, "Unsupported dimensions for YUV420: 3x2 offset 0,-2"},
         {kDraw, {NV12, 2, 2}, {NV12, 4, 3}, 0, 0, SIZE}, {kDraw, {GREY, 2, 2}, {GREY, 4, 4}, 0, 0, NONE},
-        {kDraw, {QK_FORMAT_YUYV, 2, 2}, {QK_FORMAT_YUYV, 4, 4}, 0, 0, NONE},
-    };
+        {kDraw, {QK_FORMAT_YUYV, 2, 2}, {QK_FORMAT_YUYV, 4, 4}, 0, 0, NONE}};
     for (const auto& c : cases) {
         SCOPED_TRACE(::testing::Message() << kFiles[c.op] << ", case " << &c - cases);
         std::vector<uint8_t> src_bytes(64, 1), dst_bytes(64, 2);

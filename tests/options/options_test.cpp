@@ -52,8 +52,7 @@ TEST(OptionRegister, FreshKeysAndMessages) {
                                 {4, "OptionsRegister[04]: 'scene' 0x13370004 ENUM <NO VALUES>"},
                                 {4, "OptionsRegister[05]: 'effect' 0x13370005 ENUM <NO VALUES>"},
                                 {1, "OptionsRegister[06]: 'last' 0x13370006 STRING"},
-                                {4, "OptionsRegister[07]: 'odd' 0x7fffffff INVALID TYPE (4)"}}},
-    };
+                                {4, "OptionsRegister[07]: 'odd' 0x7fffffff INVALID TYPE (4)"}}}};
     for (const auto& s : steps) {
         SCOPED_TRACE(s.option->name ? s.option->name : "(no name)");
         qktest::LogCapture log;
@@ -116,8 +115,7 @@ TEST(OptionValues, EachCheckOnItsOwnType) {
         {I, 0, 0, -5, 1},   {I, 0, 0, INT32_MIN, 1}, {I, 1, 10, 1, 1},     {I, 1, 10, 10, 1},   {I, 1, 10, 0, 0},
         {I, 1, 10, 11, 0},  {I, 10, 1, 5, 0},        {I, -10, -1, -10, 1}, {I, -10, -1, 0, 0},  {I, 0, 5, -1, 0},
         {F, -2.0f, 2.0f, 2, 1},   {F, -2.0f, 2.0f, -2, 1},  {F, -2.0f, 2.0f, 2.5, 0}, {F, -2.0f, 2.0f, NAN, 0},
-        {F, 0.0f, 0.0f, NAN, 1},  {F, -0.0f, 0.0f, 7, 1},   {F, 0.5f, 0.25f, 0.3, 0},
-    };
+        {F, 0.0f, 0.0f, NAN, 1},  {F, -0.0f, 0.0f, 7, 1},   {F, 0.5f, 0.25f, 0.3, 0}};
     for (const auto& c : ranges) {
         const QKOption_t o = {0, "o", c.type, c.min, c.max, nullptr};
         EXPECT_EQ(c.type == I ? QKOption_CheckValueI(&o, int32_t(c.value)) : QKOption_CheckValueF(&o, float(c.value)),
@@ -162,8 +160,7 @@ TEST(OptionStrings, ReadsTheNamedItemOrGivesTheDefault) {
         {"iso=-2147483648", "iso", INT32_MIN, -2147483648.0f},
         // Unusable arguments; names cannot hold the separators.
         {nullptr, "iso", kNoInt, kNoFloat}, {"iso=1", nullptr, kNoInt, kNoFloat}, {"=1", "", kNoInt, kNoFloat},
-        {"a=b=3", "a=b", kNoInt, kNoFloat}, {"x=1,a,b=2", "a,b", kNoInt, kNoFloat},
-    };
+        {"a=b=3", "a=b", kNoInt, kNoFloat}, {"x=1,a,b=2", "a,b", kNoInt, kNoFloat}};
     for (const auto& c : cases) {
         SCOPED_TRACE(std::string(c.options ? c.options : "(null)") + " " + (c.name ? c.name : "(null)"));
         EXPECT_EQ(QKOption_ParseStringI(c.options, c.name, kNoInt), c.integer);
