@@ -74,7 +74,6 @@ TEST(TimeStat, Messages) {
         {"cam", "encode", false, 12999, {"[cam] encode(77): Exit (12ms)"}},
         {"cam", "decode", true, 0, {"[cam] decode:77: Entry", "[cam] decode(77): Exit (0.000ms)"}},
         {nullptr, "scale", true, 2, {"[velcamera] scale: Entry", "[velcamera] scale(-1): Exit (0.002ms)"}},
-        {nullptr, "quiet", false, 0, {"[velcamera] quiet(-1): Exit (0.000ms)"}},
         {nullptr, nullptr, false, 0, {}}};
     for (const auto& c : cases) {
         log.clear();
