@@ -4,6 +4,8 @@
 #include <string.h>
 #include <turbojpeg.h>
 
+#include <utility>
+
 #include "image/format.h"
 #include "planes.h"
 #include "platform/memory.h"
@@ -69,7 +71,7 @@ extern "C" __attribute__((visibility("default"))) void* fastJpegDecode(const voi
     const bool yuv420 = qk::is_yuv420_format(format);
     if (pixel_format < 0 && !yuv420) return nullptr;
 
-    Handle handle(tjInitDecompress());
+    Handle handle = qk::jpeg::take_handle(qk::jpeg::g_decompressor, tjInitDecompress);
     if (!handle) return nullptr;
     const auto* stream = static_cast<const unsigned char*>(data);
     int w = 0, h = 0, subsamp = 0, colorspace = 0;
@@ -91,6 +93,7 @@ extern "C" __attribute__((visibility("default"))) void* fastJpegDecode(const voi
                                 : tjDecompress2(handle.get(), stream, size, out.get(), w, 0, h, pixel_format,
                                                 kDecodeFlags) == 0;
     if (!decoded) return nullptr;
+    qk::jpeg::keep_handle(qk::jpeg::g_decompressor, std::move(handle));
     *width = w;
     *height = h;
     return out.release();

@@ -4,6 +4,8 @@
 #include <stdlib.h>
 #include <turbojpeg.h>
 
+#include <utility>
+
 #include "image/format.h"
 #include "planes.h"
 #include "platform/memory.h"
@@ -18,24 +20,22 @@ using qk::jpeg::Handle;
 
 int clamp_quality(int32_t quality) { return quality < 1 ? 1 : quality > 100 ? 100 : quality; }
 
-// Runs `compress` (handle, &stream, &length) into a malloc'ed block of
-// TurboJPEG's worst-case length for the picture, which TJFLAG_NOREALLOC
-// keeps it from replacing, then hands the unused tail back. One allocation
-// and no copy of the stream; the untouched part of the block never costs
-// memory pages.
+// Runs `compress` (handle, &stream, &length) with TurboJPEG growing the
+// stream's buffer as it goes, then hands the unused tail back. Its buffers
+// come from malloc and are small enough to be reused from the heap: a block
+// of the worst-case length (36 MB at 4000x3000) would come fresh from the
+// system on every call, and each page the stream then wrote would fault in
+// (about 2 ms a 12-megapixel frame, measured).
 template <typename Compress>
-void* compress_into_block(int32_t width, int32_t height, int subsamp, uint32_t* length, Compress compress) {
-    const unsigned long bound = tjBufSize(width, height, subsamp);
-    if (bound == static_cast<unsigned long>(-1)) return nullptr;
-    Handle handle(tjInitCompress());
-    Block block = qk::jpeg::allocate(bound);
-    if (!handle || !block) return nullptr;
-    unsigned char* stream = block.get();
-    unsigned long written = bound;
-    if (compress(handle.get(), &stream, &written) != 0 || stream != block.get() || written == 0 ||
-        written > UINT32_MAX) {
-        return nullptr;
-    }
+void* compress_to_stream(uint32_t* length, Compress compress) {
+    Handle handle = qk::jpeg::take_handle(qk::jpeg::g_compressor, tjInitCompress);
+    if (!handle) return nullptr;
+    unsigned char* stream = nullptr;
+    unsigned long written = 0;
+    const int failed = compress(handle.get(), &stream, &written);
+    Block block(stream);  // TurboJPEG's buffer, also when it failed
+    if (failed != 0 || written == 0 || written > UINT32_MAX) return nullptr;
+    qk::jpeg::keep_handle(qk::jpeg::g_compressor, std::move(handle));
     uint8_t* whole = block.release();
     void* trimmed = realloc(whole, written);
     *length = static_cast<uint32_t>(written);
@@ -47,21 +47,17 @@ void* encode_packed(const uint8_t* pixels, int32_t width, int32_t height, int pi
     // Colour pictures are coded 4:2:0, the camera's own sampling, so that
     // they also decode straight into the 4:2:0 formats.
     const int subsamp = pixel_format == TJPF_GRAY ? TJSAMP_GRAY : TJSAMP_420;
-    return compress_into_block(width, height, subsamp, length,
-                               [&](tjhandle handle, unsigned char** stream, unsigned long* written) {
-                                   return tjCompress2(handle, pixels, width, 0, height, pixel_format, stream,
-                                                      written, subsamp, quality, TJFLAG_NOREALLOC);
-                               });
+    return compress_to_stream(length, [&](tjhandle handle, unsigned char** stream, unsigned long* written) {
+        return tjCompress2(handle, pixels, width, 0, height, pixel_format, stream, written, subsamp, quality, 0);
+    });
 }
 
 // Compresses YCbCr planes in TurboJPEG's geometry for the sampling.
 void* encode_planes(const uint8_t** planes, const int* strides, int32_t width, int32_t height, int subsamp,
                     int quality, uint32_t* length) {
-    return compress_into_block(width, height, subsamp, length,
-                               [&](tjhandle handle, unsigned char** stream, unsigned long* written) {
-                                   return tjCompressFromYUVPlanes(handle, planes, width, strides, height, subsamp,
-                                                                  stream, written, quality, TJFLAG_NOREALLOC);
-                               });
+    return compress_to_stream(length, [&](tjhandle handle, unsigned char** stream, unsigned long* written) {
+        return tjCompressFromYUVPlanes(handle, planes, width, strides, height, subsamp, stream, written, quality, 0);
+    });
 }
 
 void* encode_420(const uint8_t* pixels, int32_t width, int32_t height, uint32_t format, int quality,
