@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
-# Builds and runs every test twice: in the optimised build, and under
-# AddressSanitizer + UndefinedBehaviorSanitizer with leak checking.
+# Builds and runs every test three times: in the optimised build, under
+# AddressSanitizer + UndefinedBehaviorSanitizer with leak checking, and for
+# AArch64 under qemu.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 scripts/install-deps.sh
@@ -21,3 +22,7 @@ cmake --build build/asan -j "$jobs"
   ASAN_OPTIONS=detect_leaks=1:abort_on_error=1:strict_string_checks=1 \
   UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1 \
   ctest -j "$jobs" --timeout 600 --output-on-failure)
+
+# The device's architecture: the NEON kernels and every test, cross-built and
+# run under qemu-aarch64.
+scripts/run-tests-aarch64.sh
