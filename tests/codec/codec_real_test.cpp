@@ -105,6 +105,20 @@ TEST(JpegModule, EveryFormatDecodesIntoEveryTarget) {
     }
 }
 
+// NV12/NV21 of whole-MCU width go through libjpeg row by row, YUVP through
+// TurboJPEG's planes: the same samples give the same stream, the padding of
+// 30 rows to whole MCUs included.
+TEST(JpegModule, InterleavedChromaCodesAsPlanes) {
+    ImagePtr rgba = picture(48, 30, QK_FORMAT_RGBA);
+    for (int quality : {1, 50, 100}) {
+        const Bytes planes = encode(converted(*rgba, QK_FORMAT_YUVP), 48, 30, QK_FORMAT_YUVP, quality);
+        EXPECT_FALSE(planes.empty());
+        for (uint32_t f : {QK_FORMAT_NV12, QK_FORMAT_NV21}) {
+            EXPECT_EQ(encode(converted(*rgba, f), 48, 30, f, quality), planes) << fourcc(f) << quality;
+        }
+    }
+}
+
 // Nothing is coded from what the module cannot read in full or does not
 // know, and nothing is said; qualities outside 1..100 are the nearest end.
 TEST(JpegModule, RefusesQuietlyWhatItCannotCode) {

@@ -10,6 +10,7 @@
 #include "planes.h"
 #include "platform/memory.h"
 #include "qkcore/qk_image.h"
+#include "raw420.h"
 #include "turbo.h"
 #include "veljpeginterface.h"
 
@@ -63,6 +64,10 @@ void* encode_planes(const uint8_t** planes, const int* strides, int32_t width, i
 void* encode_420(const uint8_t* pixels, int32_t width, int32_t height, uint32_t format, int quality,
                  uint32_t* length) {
     const qk::jpeg::Chroma420 chroma = qk::jpeg::chroma420(width, height, format);
+    // NV12/NV21 at whole-MCU widths skip the frame-sized chroma planes.
+    if (qk::jpeg::raw420_fits(width, height, chroma)) {
+        return qk::jpeg::compress_raw420(pixels, width, height, chroma, quality, length);
+    }
     const qk::jpeg::TurboPlanes turbo = qk::jpeg::turbo_planes(width, height, true);
     const bool even = width % 2 == 0 && height % 2 == 0;
     const uint8_t* planes[3] = {pixels, pixels + chroma.u, pixels + chroma.v};
