@@ -10,6 +10,7 @@
 
 #include "convert/pixel.h"
 #include "convert/row.h"
+#include "convert/row_slots.h"
 #include "convert/row_loops.h"
 
 namespace qk {
@@ -83,19 +84,12 @@ constexpr std::array<RgbToLumaRow, sizeof...(I)> rgb_to_luma_table(std::index_se
 }
 constexpr auto kRgbToLumaRows = rgb_to_luma_table(std::make_index_sequence<kRgbFormatCount * 2>());
 
-constexpr int kChromaSteps[] = {1, 2, 4};
 template <size_t... I>
 constexpr std::array<RgbToChromaRow, sizeof...(I)> rgb_to_chroma_table(std::index_sequence<I...>) {
     return {rgb_to_chroma<I / 3, kChromaSteps[I % 3]>...};
 }
 constexpr auto kRgbToChromaRows = rgb_to_chroma_table(std::make_index_sequence<kRgbFormatCount * 3>());
 
-int chroma_step_index(int step) {
-    for (int i = 0; i < 3; ++i) {
-        if (kChromaSteps[i] == step) return i;
-    }
-    return -1;
-}
 
 // YUV to RGB -----------------------------------------------------------------
 
@@ -219,14 +213,6 @@ void yuv_to_rgb(const uint8_t* y0, const uint8_t* y1, const uint8_t* u, const ui
     }
 }
 
-// The two source shapes: 4:2:0 (two rows per chroma row, planar or
-// interleaved chroma) and packed 4:2:2.
-struct YuvSourceShape {
-    int lumaStep, chromaStep, rows;
-};
-constexpr YuvSourceShape kYuvSourceShapes[] = {{1, 1, 2}, {1, 2, 2}, {2, 4, 1}};
-constexpr int kYuvSourceShapeCount = 3;
-
 template <size_t... I>
 constexpr std::array<YuvToRgbRow, sizeof...(I)> yuv_to_rgb_table(std::index_sequence<I...>) {
     return {yuv_to_rgb<I / kYuvSourceShapeCount, kYuvSourceShapes[I % kYuvSourceShapeCount].lumaStep,
@@ -276,50 +262,27 @@ void pack_row(const uint8_t* luma, const uint8_t* u, const uint8_t* v, int, uint
     pack_loop(luma, u, v, ChromaStep, dst, dst_u, dst_v, width);
 }
 
-bool valid_rgb_index(int index) { return index >= 0 && index < kRgbFormatCount; }
-bool valid_luma_step(int step) { return step == 1 || step == 2; }
-
 RgbToRgbRow portable_rgb_to_rgb(int src_index, int dst_index) {
-    if (!valid_rgb_index(src_index) || !valid_rgb_index(dst_index)) return rgb_to_rgb_row_reference;
-    return kRgbToRgbRows[src_index * kRgbFormatCount + dst_index];
+    return slot_row(kRgbToRgbRows, rgb_to_rgb_slot(src_index, dst_index), rgb_to_rgb_row_reference);
 }
-
 RgbToLumaRow portable_rgb_to_luma(int src_index, int luma_step) {
-    if (!valid_rgb_index(src_index) || !valid_luma_step(luma_step)) return rgb_to_luma_row_reference;
-    return kRgbToLumaRows[src_index * 2 + luma_step - 1];
+    return slot_row(kRgbToLumaRows, rgb_to_luma_slot(src_index, luma_step), rgb_to_luma_row_reference);
 }
-
 RgbToChromaRow portable_rgb_to_chroma(int src_index, int chroma_step) {
-    const int step = chroma_step_index(chroma_step);
-    if (!valid_rgb_index(src_index) || step < 0) return rgb_to_chroma_row_reference;
-    return kRgbToChromaRows[src_index * 3 + step];
+    return slot_row(kRgbToChromaRows, rgb_to_chroma_slot(src_index, chroma_step), rgb_to_chroma_row_reference);
 }
-
 YuvToRgbRow portable_yuv_to_rgb(int dst_index, int luma_step, int chroma_step, int rows) {
-    if (!valid_rgb_index(dst_index)) return yuv_to_rgb_row_reference;
-    for (int i = 0; i < kYuvSourceShapeCount; ++i) {
-        const YuvSourceShape& shape = kYuvSourceShapes[i];
-        if (shape.lumaStep == luma_step && shape.chromaStep == chroma_step && shape.rows == rows) {
-            return kYuvToRgbRows[dst_index * kYuvSourceShapeCount + i];
-        }
-    }
-    return yuv_to_rgb_row_reference;
+    return slot_row(kYuvToRgbRows, yuv_to_rgb_slot(dst_index, luma_step, chroma_step, rows),
+                    yuv_to_rgb_row_reference);
 }
-
 GreyToRgbRow portable_grey_to_rgb(int dst_index) {
-    return valid_rgb_index(dst_index) ? kGreyToRgbRows[dst_index] : grey_to_rgb_row_reference;
+    return slot_row(kGreyToRgbRows, grey_to_rgb_slot(dst_index), grey_to_rgb_row_reference);
 }
-
 SampleRow portable_sample(int src_step, int dst_step) {
-    if (!valid_luma_step(src_step) || !valid_luma_step(dst_step)) return sample_row_reference;
-    return kSampleRows[(src_step - 1) * 2 + dst_step - 1];
+    return slot_row(kSampleRows, sample_slot(src_step, dst_step), sample_row_reference);
 }
-
 ChromaRow portable_chroma(int src_step, int dst_step) {
-    const int src = chroma_step_index(src_step);
-    const int dst = chroma_step_index(dst_step);
-    if (src < 0 || dst < 0) return chroma_row_reference;
-    return kChromaRows[src * 3 + dst];
+    return slot_row(kChromaRows, chroma_slot(src_step, dst_step), chroma_row_reference);
 }
 
 void unpack_row(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma, uint8_t* u, uint8_t* v,
