@@ -81,7 +81,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm256_slli_si256(a, N);
 }
 
-#define v_adds_epu16 _mm256_adds_epu16
+#define v_subs_epu16 _mm256_subs_epu16
 #define v_adds_epu8 _mm256_adds_epu8
 #define v_cmpeq_epi16 _mm256_cmpeq_epi16
 #define v_max_epi16 _mm256_max_epi16

@@ -59,7 +59,7 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm_slli_si128(a, N);
 }
 
-#define v_adds_epu16 _mm_adds_epu16
+#define v_subs_epu16 _mm_subs_epu16
 #define v_adds_epu8 _mm_adds_epu8
 #define v_cmpeq_epi16 _mm_cmpeq_epi16
 #define v_max_epi16 _mm_max_epi16
