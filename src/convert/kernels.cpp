@@ -7,6 +7,7 @@
 
 #include "convert/row.h"
 #include "image/format.h"
+#include "platform/memory.h"
 
 namespace qk {
 namespace {
@@ -16,6 +17,9 @@ namespace {
 ptrdiff_t chroma_row_offset(const YuvLayout& layout, ptrdiff_t y, ptrdiff_t width) {
     return (layout.subsampledRows ? y / 2 : y) * (width / 2) * layout.chromaStep;
 }
+
+// Whether a destination of this many bytes is written with streaming stores.
+bool streamed(ptrdiff_t bytes) { return static_cast<uint64_t>(bytes) >= platform::kStreamBytes; }
 
 // Whether image row y writes a chroma row of this destination layout: every
 // row of a packed 4:2:2 image, the even rows of a 4:2:0 image.
@@ -28,13 +32,15 @@ bool row_carries_chroma(const YuvLayout& layout, ptrdiff_t y) {
 void convert_rgb_to_rgb(const QKImage& src, QKImage& dst) {
     const int s = rgb_format_index(src.format);
     const int d = rgb_format_index(dst.format);
-    const RgbToRgbShape shape{kFormats[s].rgb, kFormats[d].rgb};
-    const RgbToRgbRow row = select_rgb_to_rgb_row(s, d);
     const ptrdiff_t width = src.width;
+    const RgbToRgbShape shape{kFormats[s].rgb, kFormats[d].rgb,
+                              streamed(width * src.height * kFormats[d].rgb.bytesPerPixel)};
+    const RgbToRgbRow row = select_rgb_to_rgb_row(s, d);
     for (ptrdiff_t y = 0; y < src.height; ++y) {
         row(src.data + y * width * shape.src.bytesPerPixel, dst.data + y * width * shape.dst.bytesPerPixel,
             src.width, shape);
     }
+    if (shape.stream) finish_streaming();
 }
 
 void convert_rgb_to_yuv(const QKImage& src, QKImage& dst) {
@@ -69,7 +75,7 @@ void convert_yuv_to_rgb(const QKImage& src, QKImage& dst) {
     }
     // A 4:2:0 source converts two rows per chroma row.
     const int rows = in.subsampledRows ? 2 : 1;
-    const YuvToRgbShape shape{in.lumaStep, in.chromaStep, rows, out};
+    const YuvToRgbShape shape{in.lumaStep, in.chromaStep, rows, out, streamed(row_bytes * src.height)};
     const YuvToRgbRow row = select_yuv_to_rgb_row(d, in.lumaStep, in.chromaStep, rows);
     const ptrdiff_t luma_row_bytes = width * in.lumaStep;
     for (ptrdiff_t y = 0; y < src.height; y += rows) {
@@ -79,6 +85,7 @@ void convert_yuv_to_rgb(const QKImage& src, QKImage& dst) {
         row(luma, rows == 2 ? luma + luma_row_bytes : nullptr, src.data + in_chroma.u + offset,
             src.data + in_chroma.v + offset, pixels, rows == 2 ? pixels + row_bytes : nullptr, src.width, shape);
     }
+    if (shape.stream) finish_streaming();
 }
 
 void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {

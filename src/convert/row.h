@@ -14,9 +14,15 @@
 namespace qk {
 
 // RGB to RGB: `width` pixels from src to dst.
+//
+// `stream` (here and in YuvToRgbShape): kernels with streaming stores may
+// write 4-byte pixels with them, past the caches, for a destination too
+// large to stay there; the caller calls finish_streaming() after its last
+// row, before the pixels are read.
 struct RgbToRgbShape {
     RgbLayout src;
     RgbLayout dst;
+    bool stream = false;
 };
 using RgbToRgbRow = void (*)(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape& shape);
 void rgb_to_rgb_row_reference(const uint8_t* src, uint8_t* dst, int width, const RgbToRgbShape& shape);
@@ -46,6 +52,7 @@ struct YuvToRgbShape {
     int chromaStep;
     int rows;  // 1 or 2
     RgbLayout dst;
+    bool stream = false;
 };
 using YuvToRgbRow = void (*)(const uint8_t* y0, const uint8_t* y1, const uint8_t* u, const uint8_t* v,
                              uint8_t* d0, uint8_t* d1, int width, const YuvToRgbShape& shape);
@@ -86,6 +93,10 @@ using UnpackRow = void (*)(const uint8_t* src, const uint8_t* src_u, const uint8
 void unpack_row_reference(const uint8_t* src, const uint8_t* src_u, const uint8_t* src_v, uint8_t* luma, uint8_t* u,
                           uint8_t* v, int width);
 UnpackRow select_unpack_row();
+// Orders streamed stores before whatever follows them (x86); nothing
+// elsewhere.
+void finish_streaming();
+
 // Sets `count` U and V samples, `step` bytes apart, to `value`.
 void fill_chroma_row(uint8_t* u, uint8_t* v, int step, int count, uint8_t value);
 

@@ -3,6 +3,10 @@
 // portable set, which answers every request.
 #include <atomic>
 
+#if defined(__x86_64__)
+#include <emmintrin.h>
+#endif
+
 #include "convert/row.h"
 
 namespace qk {
@@ -66,6 +70,12 @@ SampleRow select_sample_row(int src_step, int dst_step) {
 }
 ChromaRow select_chroma_row(int src_step, int dst_step) {
     return choose(&RowKernelSet::chroma, src_step, dst_step);
+}
+
+void finish_streaming() {
+#if defined(__x86_64__)
+    _mm_sfence();
+#endif
 }
 
 PackRow select_pack_row(int chroma_step) { return choose(&RowKernelSet::pack, chroma_step); }

@@ -24,6 +24,13 @@ void* allocate_pixels(size_t bytes, bool cleared = false, bool map_in = true);
 // pages written before its data runs out, not the whole claim.
 inline bool worth_mapping_in(uint64_t bytes, uint64_t encoded_bytes) { return bytes / 4096 <= encoded_bytes; }
 
+// Pixels written from this many bytes of destination on go past the caches
+// to memory where the instruction set has streaming stores (x86): beyond a
+// core's share of the last-level cache on most machines (1.5 to 4 MB), a
+// frame is not kept there anyway, and ordinary stores would first read in
+// every line they overwrite.
+constexpr uint64_t kStreamBytes = uint64_t{4} << 20;
+
 }  // namespace qk::platform
 
 #endif  // QKCORE_SRC_PLATFORM_MEMORY_H

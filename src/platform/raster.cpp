@@ -387,10 +387,6 @@ int32_t source_index(int64_t i, float scale, int32_t limit) {
     return mapped >= static_cast<float>(limit) ? limit - 1 : static_cast<int32_t>(mapped);
 }
 
-// Destinations from this size on are streamed (x86): past the last-level
-// cache's share of a core on most machines, so not kept there anyway.
-constexpr uint64_t kStreamBytes = uint64_t{8} << 20;
-
 // Goes down the target rows in runs showing the same source row (the row
 // under their centres), calling draw(first target row, rows in the run,
 // source row, source row of the next run). The next run's row is fetched

@@ -102,12 +102,17 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
             QK_PICK(grey_to_rgb_row_reference, greyToRgb, s);
             return kernel(r.in(w), r.out(w * bpp), w, rgb), true;
         });
-        for (int d = 0; d < kRgbFormatCount; ++d) {
-            const RgbToRgbShape shape{rgb, kFormats[d].rgb};
-            all.emplace_back(from + " to " + kFormats[d].name, [=](const RowKernelSet* set, int w, Rows& r) {
-                QK_PICK(rgb_to_rgb_row_reference, rgbToRgb, s, d);
-                return kernel(r.in(w * bpp), r.out(size_t(w) * shape.dst.bytesPerPixel), w, shape), true;
-            });
+        // Streamed where the set streams 4-byte pixels, at every alignment.
+        for (const bool stream : {false, true}) {
+            const std::string how = stream ? " streamed" : "";
+            for (int d = 0; d < kRgbFormatCount; ++d) {
+                const RgbToRgbShape shape{rgb, kFormats[d].rgb, stream};
+                const std::string name = from + " to " + kFormats[d].name + how;
+                all.emplace_back(name, [=](const RowKernelSet* set, int w, Rows& r) {
+                    QK_PICK(rgb_to_rgb_row_reference, rgbToRgb, s, d);
+                    return kernel(r.in(w * bpp), r.out(size_t(w) * shape.dst.bytesPerPixel), w, shape), true;
+                });
+            }
         }
         for (int step : {1, 2, 4}) {
             const RgbToYuvShape shape{rgb, step, step};
@@ -129,20 +134,23 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
         // and packed 4:2:2, even widths only. The second chroma pair takes
         // the double path.
         for (int chromaStep : {1, 2, 4}) {
-            const int lumaStep = chromaStep == 4 ? 2 : 1, rows = 3 - lumaStep;
-            const YuvToRgbShape shape{lumaStep, chromaStep, rows, rgb};
-            all.emplace_back("YUV step " + std::to_string(chromaStep) + " to " + from, [=](const RowKernelSet* set,
-                                                                                          int w, Rows& r) {
-                QK_PICK(yuv_to_rgb_row_reference, yuvToRgb, s, lumaStep, chromaStep, rows);
-                const int even = w / 2 * 2;
-                uint8_t* y0 = r.in(size_t(even) * lumaStep);
-                uint8_t* y1 = rows == 2 ? r.in(even) : nullptr;
-                auto [u, v] = rows == 2 ? r.chroma(false, chromaStep, even / 2) : std::pair{y0 + 1, y0 + 3};
-                if (even >= 4) u[chromaStep] = 28, v[chromaStep] = 228;
-                uint8_t* d0 = r.out(even * bpp);
-                uint8_t* d1 = rows == 2 ? r.out(even * bpp) : nullptr;
-                return kernel(y0, y1, u, v, d0, d1, even, shape), true;
-            });
+            for (const bool stream : {false, true}) {
+                const int lumaStep = chromaStep == 4 ? 2 : 1, rows = 3 - lumaStep;
+                const YuvToRgbShape shape{lumaStep, chromaStep, rows, rgb, stream};
+                const std::string name =
+                    "YUV step " + std::to_string(chromaStep) + " to " + from + (stream ? " streamed" : "");
+                all.emplace_back(name, [=](const RowKernelSet* set, int w, Rows& r) {
+                    QK_PICK(yuv_to_rgb_row_reference, yuvToRgb, s, lumaStep, chromaStep, rows);
+                    const int even = w / 2 * 2;
+                    uint8_t* y0 = r.in(size_t(even) * lumaStep);
+                    uint8_t* y1 = rows == 2 ? r.in(even) : nullptr;
+                    auto [u, v] = rows == 2 ? r.chroma(false, chromaStep, even / 2) : std::pair{y0 + 1, y0 + 3};
+                    if (even >= 4) u[chromaStep] = 28, v[chromaStep] = 228;
+                    uint8_t* d0 = r.out(even * bpp);
+                    uint8_t* d1 = rows == 2 ? r.out(even * bpp) : nullptr;
+                    return kernel(y0, y1, u, v, d0, d1, even, shape), true;
+                });
+            }
         }
     }
     for (int from : {1, 2, 4}) {

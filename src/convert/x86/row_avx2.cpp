@@ -38,6 +38,11 @@ QK_SIMD void store(uint8_t* p, ptrdiff_t lane, V value) {
     _mm_storeu_si128(reinterpret_cast<__m128i*>(p), _mm256_castsi256_si128(value));
     _mm_storeu_si128(reinterpret_cast<__m128i*>(p + lane), _mm256_extracti128_si256(value, 1));
 }
+// store() past the caches, 16-byte aligned.
+QK_SIMD void store_streamed(uint8_t* p, ptrdiff_t lane, V value) {
+    _mm_stream_si128(reinterpret_cast<__m128i*>(p), _mm256_castsi256_si128(value));
+    _mm_stream_si128(reinterpret_cast<__m128i*>(p + lane), _mm256_extracti128_si256(value, 1));
+}
 // 8 bytes into the low half of each lane.
 QK_SIMD V load_half(const uint8_t* p, ptrdiff_t lane) {
     return _mm256_inserti128_si256(_mm256_castsi128_si256(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p))),

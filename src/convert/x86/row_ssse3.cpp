@@ -30,6 +30,8 @@ constexpr int kLanes = 1;
 
 QK_SIMD V load(const uint8_t* p, ptrdiff_t) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
 QK_SIMD void store(uint8_t* p, ptrdiff_t, V value) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), value); }
+// store() past the caches, 16-byte aligned.
+QK_SIMD void store_streamed(uint8_t* p, ptrdiff_t, V value) { _mm_stream_si128(reinterpret_cast<__m128i*>(p), value); }
 // 8 bytes into the low half.
 QK_SIMD V load_half(const uint8_t* p, ptrdiff_t) { return _mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)); }
 QK_SIMD V v_broadcast(const int8_t* bytes) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(bytes)); }
