@@ -124,6 +124,26 @@ extern const RowKernelSet kPortableRows;
 // instruction set; the select_* functions consult those this CPU supports,
 // in this order, before the portable set.
 #if defined(__x86_64__)
+// The 16-bit factors of the YUV to RGB kernels (x86/row_x86_kernels.inc
+// derives them).
+enum YuvFactor {
+    kFactorRedV,
+    kFactorBlueU,
+    kFactorGreenU,
+    kFactorGreenV,
+    kFactorGreenULow,
+    kFactorGreenVLow,
+    kFactorFiftyThousand,
+    kYuvFactorCount
+};
+constexpr int16_t kYuvFactorValues[kYuvFactorCount] = {26346, -14942, -22560, 18726, -17207, 29829, -15536};
+// The same, each repeated over 16 bytes and defined in another file, where
+// the kernels' compiler cannot see the values: it then reads them from memory
+// when registers run short, rather than building them anew in the loop.
+struct YuvFactorVectors {
+    alignas(16) int16_t word[kYuvFactorCount][8];
+};
+extern const YuvFactorVectors kYuvFactorVectors;
 extern const RowKernelSet kAvx2Rows;   // x86/row_avx2.cpp
 extern const RowKernelSet kSsse3Rows;  // x86/row_ssse3.cpp
 #elif defined(__aarch64__)

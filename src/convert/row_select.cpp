@@ -72,6 +72,17 @@ ChromaRow select_chroma_row(int src_step, int dst_step) {
     return choose(&RowKernelSet::chroma, src_step, dst_step);
 }
 
+#if defined(__x86_64__)
+constexpr YuvFactorVectors repeat_factors() {
+    YuvFactorVectors vectors{};
+    for (int f = 0; f < kYuvFactorCount; ++f) {
+        for (int16_t& word : vectors.word[f]) word = kYuvFactorValues[f];
+    }
+    return vectors;
+}
+const YuvFactorVectors kYuvFactorVectors = repeat_factors();
+#endif
+
 void finish_streaming() {
 #if defined(__x86_64__)
     _mm_sfence();
