@@ -144,6 +144,7 @@ struct YuvFactorVectors {
     alignas(16) int16_t word[kYuvFactorCount][8];
 };
 extern const YuvFactorVectors kYuvFactorVectors;
+extern const RowKernelSet kAvx512Rows;  // x86/row_avx512.cpp
 extern const RowKernelSet kAvx2Rows;   // x86/row_avx2.cpp
 extern const RowKernelSet kSsse3Rows;  // x86/row_ssse3.cpp
 #elif defined(__aarch64__)

@@ -20,6 +20,8 @@ SupportedRowSets detect_row_sets() {
     // libgcc's checks include the operating system's saving of the AVX
     // registers, not only the CPUID bits.
     __builtin_cpu_init();
+    if (__builtin_cpu_supports("avx512f") && __builtin_cpu_supports("avx512bw"))
+        supported.sets[supported.count++] = &kAvx512Rows;
     if (__builtin_cpu_supports("avx2")) supported.sets[supported.count++] = &kAvx2Rows;
     if (__builtin_cpu_supports("ssse3")) supported.sets[supported.count++] = &kSsse3Rows;
 #elif defined(__aarch64__)

@@ -231,13 +231,15 @@ TEST(RowVariants, EveryVariantWritesExactlyTheBytesOfItsReferenceWithinItsRows) 
     signal(SIGSEGV, SIG_DFL);
 }
 
-// The best set this CPU supports answers first; turned off, only the
-// portable set does.
+// The best set this CPU supports that has the kernel answers first; turned
+// off, only the portable set does.
 TEST(RowSelection, SimdSetsComeFirstUnlessTurnedOff) {
     const int s = rgb_format_index(QK_FORMAT_RGBA), d = rgb_format_index(QK_FORMAT_BGRA);
     const SupportedRowSets& supported = supported_row_sets();
-    const RgbToRgbRow best = supported.count > 0 && supported.sets[0]->rgbToRgb ? supported.sets[0]->rgbToRgb(s, d)
-                                                                                  : nullptr;
+    RgbToRgbRow best = nullptr;
+    for (int i = 0; i < supported.count && best == nullptr; ++i) {
+        if (supported.sets[i]->rgbToRgb != nullptr) best = supported.sets[i]->rgbToRgb(s, d);
+    }
     EXPECT_EQ(select_rgb_to_rgb_row(s, d), best != nullptr ? best : kPortableRows.rgbToRgb(s, d));
     set_simd_enabled(false);
     EXPECT_EQ(select_rgb_to_rgb_row(s, d), kPortableRows.rgbToRgb(s, d));
