@@ -35,33 +35,29 @@ using V = __m512i;
 constexpr int kLanes = 4;
 
 QK_SIMD __m128i load16(const uint8_t* p) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
-QK_SIMD V load(const uint8_t* p, ptrdiff_t lane) {
-    V v = _mm512_zextsi128_si512(load16(p));
-    v = _mm512_inserti32x4(v, load16(p + lane), 1);
-    v = _mm512_inserti32x4(v, load16(p + 2 * lane), 2);
-    return _mm512_inserti32x4(v, load16(p + 3 * lane), 3);
-}
-QK_SIMD void store(uint8_t* p, ptrdiff_t lane, V value) {
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(p), _mm512_castsi512_si128(value));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(p + lane), _mm512_extracti32x4_epi32(value, 1));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(p + 2 * lane), _mm512_extracti32x4_epi32(value, 2));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(p + 3 * lane), _mm512_extracti32x4_epi32(value, 3));
-}
-// store() past the caches, 16-byte aligned.
-QK_SIMD void store_streamed(uint8_t* p, ptrdiff_t lane, V value) {
-    _mm_stream_si128(reinterpret_cast<__m128i*>(p), _mm512_castsi512_si128(value));
-    _mm_stream_si128(reinterpret_cast<__m128i*>(p + lane), _mm512_extracti32x4_epi32(value, 1));
-    _mm_stream_si128(reinterpret_cast<__m128i*>(p + 2 * lane), _mm512_extracti32x4_epi32(value, 2));
-    _mm_stream_si128(reinterpret_cast<__m128i*>(p + 3 * lane), _mm512_extracti32x4_epi32(value, 3));
-}
-// 8 bytes into the low half of each lane.
 QK_SIMD __m128i load8(const uint8_t* p) { return _mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)); }
-QK_SIMD V load_half(const uint8_t* p, ptrdiff_t lane) {
-    V v = _mm512_zextsi128_si512(load8(p));
-    v = _mm512_inserti32x4(v, load8(p + lane), 1);
-    v = _mm512_inserti32x4(v, load8(p + 2 * lane), 2);
-    return _mm512_inserti32x4(v, load8(p + 3 * lane), 3);
+// A vector of four pieces that `piece` loads, lane k's from p + k * lane.
+QK_SIMD V gather(const uint8_t* p, ptrdiff_t lane, __m128i (*piece)(const uint8_t*)) {
+    V v = _mm512_zextsi128_si512(piece(p));
+    v = _mm512_inserti32x4(v, piece(p + lane), 1);
+    v = _mm512_inserti32x4(v, piece(p + 2 * lane), 2);
+    return _mm512_inserti32x4(v, piece(p + 3 * lane), 3);
 }
+QK_SIMD V load(const uint8_t* p, ptrdiff_t lane) { return gather(p, lane, load16); }
+// 8 bytes into the low half of each lane.
+QK_SIMD V load_half(const uint8_t* p, ptrdiff_t lane) { return gather(p, lane, load8); }
+QK_SIMD void store16(uint8_t* p, __m128i value) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), value); }
+QK_SIMD void stream16(uint8_t* p, __m128i value) { _mm_stream_si128(reinterpret_cast<__m128i*>(p), value); }
+// The four lanes of `value`, each stored by `piece`, lane k's at p + k * lane.
+QK_SIMD void scatter(uint8_t* p, ptrdiff_t lane, V value, void (*piece)(uint8_t*, __m128i)) {
+    piece(p, _mm512_castsi512_si128(value));
+    piece(p + lane, _mm512_extracti32x4_epi32(value, 1));
+    piece(p + 2 * lane, _mm512_extracti32x4_epi32(value, 2));
+    piece(p + 3 * lane, _mm512_extracti32x4_epi32(value, 3));
+}
+QK_SIMD void store(uint8_t* p, ptrdiff_t lane, V value) { scatter(p, lane, value, store16); }
+// store() past the caches, 16-byte aligned.
+QK_SIMD void store_streamed(uint8_t* p, ptrdiff_t lane, V value) { scatter(p, lane, value, stream16); }
 QK_SIMD V v_broadcast(const int8_t* bytes) {
     return _mm512_broadcast_i32x4(load16(reinterpret_cast<const uint8_t*>(bytes)));
 }
