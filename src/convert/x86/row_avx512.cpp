@@ -144,7 +144,8 @@ QK_SIMD V add_one_where_le_epu16(V x, V a, V b) {
 
 }  // namespace
 
-const RowKernelSet kAvx512Rows = {"avx512", nullptr,          nullptr, nullptr, simd_yuv_to_rgb,
-                                  simd_grey_to_rgb, nullptr, nullptr,          nullptr, nullptr};
+// The kernels to RGB only (see the top of this file).
+const RowKernelSet kAvx512Rows = {"avx512", nullptr, nullptr, nullptr, simd_yuv_to_rgb, simd_grey_to_rgb,
+                                  nullptr,  nullptr, nullptr, nullptr};
 
 }  // namespace qk
