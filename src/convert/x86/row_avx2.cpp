@@ -86,42 +86,8 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm256_slli_si256(a, N);
 }
 
-#define v_subs_epu16 _mm256_subs_epu16
-#define v_adds_epu8 _mm256_adds_epu8
-#define v_cmpeq_epi16 _mm256_cmpeq_epi16
-#define v_max_epi16 _mm256_max_epi16
-#define v_min_epi16 _mm256_min_epi16
-#define v_mullo_epi16 _mm256_mullo_epi16
-#define v_subs_epu8 _mm256_subs_epu8
-#define v_unpackhi_epi64 _mm256_unpackhi_epi64
-#define v_unpacklo_epi64 _mm256_unpacklo_epi64
-#define v_add_epi16 _mm256_add_epi16
-#define v_add_epi32 _mm256_add_epi32
-#define v_cmpeq_epi8 _mm256_cmpeq_epi8
-#define v_madd_epi16 _mm256_madd_epi16
-#define v_movemask_epi8 _mm256_movemask_epi8
-#define v_mul_epu32 _mm256_mul_epu32
-#define v_mulhi_epi16 _mm256_mulhi_epi16
-#define v_packs_epi32 _mm256_packs_epi32
-#define v_packus_epi16 _mm256_packus_epi16
-#define v_set1_epi16 _mm256_set1_epi16
-#define v_set1_epi32 _mm256_set1_epi32
-#define v_set1_epi8 _mm256_set1_epi8
-#define v_shuffle_epi8 _mm256_shuffle_epi8
-#define v_slli_epi16 _mm256_slli_epi16
-#define v_slli_epi32 _mm256_slli_epi32
-#define v_slli_epi64 _mm256_slli_epi64
-#define v_srai_epi16 _mm256_srai_epi16
-#define v_srai_epi32 _mm256_srai_epi32
-#define v_srli_epi16 _mm256_srli_epi16
-#define v_srli_epi32 _mm256_srli_epi32
-#define v_srli_epi64 _mm256_srli_epi64
-#define v_sub_epi16 _mm256_sub_epi16
-#define v_sub_epi32 _mm256_sub_epi32
-#define v_unpackhi_epi16 _mm256_unpackhi_epi16
-#define v_unpackhi_epi8 _mm256_unpackhi_epi8
-#define v_unpacklo_epi16 _mm256_unpacklo_epi16
-#define v_unpacklo_epi8 _mm256_unpacklo_epi8
+#define QK_X86_OP(name) _mm256_##name
+#include "convert/x86/row_x86_ops.h"
 
 #include "convert/x86/row_x86_kernels.inc"
 

@@ -106,39 +106,8 @@ QK_SIMD V add_one_where_le_epu16(V x, V a, V b) {
     return _mm512_mask_sub_epi16(x, _mm512_cmple_epu16_mask(a, b), x, _mm512_set1_epi32(-1));
 }
 
-#define v_subs_epu16 _mm512_subs_epu16
-#define v_adds_epu8 _mm512_adds_epu8
-#define v_max_epi16 _mm512_max_epi16
-#define v_min_epi16 _mm512_min_epi16
-#define v_mullo_epi16 _mm512_mullo_epi16
-#define v_subs_epu8 _mm512_subs_epu8
-#define v_unpackhi_epi64 _mm512_unpackhi_epi64
-#define v_unpacklo_epi64 _mm512_unpacklo_epi64
-#define v_add_epi16 _mm512_add_epi16
-#define v_add_epi32 _mm512_add_epi32
-#define v_madd_epi16 _mm512_madd_epi16
-#define v_mul_epu32 _mm512_mul_epu32
-#define v_mulhi_epi16 _mm512_mulhi_epi16
-#define v_packs_epi32 _mm512_packs_epi32
-#define v_packus_epi16 _mm512_packus_epi16
-#define v_set1_epi16 _mm512_set1_epi16
-#define v_set1_epi32 _mm512_set1_epi32
-#define v_set1_epi8 _mm512_set1_epi8
-#define v_shuffle_epi8 _mm512_shuffle_epi8
-#define v_slli_epi16 _mm512_slli_epi16
-#define v_slli_epi32 _mm512_slli_epi32
-#define v_slli_epi64 _mm512_slli_epi64
-#define v_srai_epi16 _mm512_srai_epi16
-#define v_srai_epi32 _mm512_srai_epi32
-#define v_srli_epi16 _mm512_srli_epi16
-#define v_srli_epi32 _mm512_srli_epi32
-#define v_srli_epi64 _mm512_srli_epi64
-#define v_sub_epi16 _mm512_sub_epi16
-#define v_sub_epi32 _mm512_sub_epi32
-#define v_unpackhi_epi16 _mm512_unpackhi_epi16
-#define v_unpackhi_epi8 _mm512_unpackhi_epi8
-#define v_unpacklo_epi16 _mm512_unpacklo_epi16
-#define v_unpacklo_epi8 _mm512_unpacklo_epi8
+#define QK_X86_OP(name) _mm512_##name
+#include "convert/x86/row_x86_ops.h"
 
 #include "convert/x86/row_x86_kernels.inc"
 

@@ -61,42 +61,8 @@ QK_SIMD V v_shift_left_bytes(V a) {
     return _mm_slli_si128(a, N);
 }
 
-#define v_subs_epu16 _mm_subs_epu16
-#define v_adds_epu8 _mm_adds_epu8
-#define v_cmpeq_epi16 _mm_cmpeq_epi16
-#define v_max_epi16 _mm_max_epi16
-#define v_min_epi16 _mm_min_epi16
-#define v_mullo_epi16 _mm_mullo_epi16
-#define v_subs_epu8 _mm_subs_epu8
-#define v_unpackhi_epi64 _mm_unpackhi_epi64
-#define v_unpacklo_epi64 _mm_unpacklo_epi64
-#define v_add_epi16 _mm_add_epi16
-#define v_add_epi32 _mm_add_epi32
-#define v_cmpeq_epi8 _mm_cmpeq_epi8
-#define v_madd_epi16 _mm_madd_epi16
-#define v_movemask_epi8 _mm_movemask_epi8
-#define v_mul_epu32 _mm_mul_epu32
-#define v_mulhi_epi16 _mm_mulhi_epi16
-#define v_packs_epi32 _mm_packs_epi32
-#define v_packus_epi16 _mm_packus_epi16
-#define v_set1_epi16 _mm_set1_epi16
-#define v_set1_epi32 _mm_set1_epi32
-#define v_set1_epi8 _mm_set1_epi8
-#define v_shuffle_epi8 _mm_shuffle_epi8
-#define v_slli_epi16 _mm_slli_epi16
-#define v_slli_epi32 _mm_slli_epi32
-#define v_slli_epi64 _mm_slli_epi64
-#define v_srai_epi16 _mm_srai_epi16
-#define v_srai_epi32 _mm_srai_epi32
-#define v_srli_epi16 _mm_srli_epi16
-#define v_srli_epi32 _mm_srli_epi32
-#define v_srli_epi64 _mm_srli_epi64
-#define v_sub_epi16 _mm_sub_epi16
-#define v_sub_epi32 _mm_sub_epi32
-#define v_unpackhi_epi16 _mm_unpackhi_epi16
-#define v_unpackhi_epi8 _mm_unpackhi_epi8
-#define v_unpacklo_epi16 _mm_unpacklo_epi16
-#define v_unpacklo_epi8 _mm_unpacklo_epi8
+#define QK_X86_OP(name) _mm_##name
+#include "convert/x86/row_x86_ops.h"
 
 #include "convert/x86/row_x86_kernels.inc"
 
