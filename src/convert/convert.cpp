@@ -6,6 +6,7 @@
 #include "convert/kernels.h"
 #include "image/checks.h"
 #include "image/format.h"
+#include "platform/memory.h"
 #include "qkcore/qk_converter.h"
 #include "qkcore/qk_image.h"
 #include "util/log.h"
@@ -21,11 +22,21 @@ Family family_of(uint32_t format) {
     return Family::kOther;
 }
 
+// memmove where the two overlap, because converting an image into itself is
+// a harmless no-op.
+void move_bytes(uint8_t* dst, const uint8_t* src, uint64_t bytes) {
+    const uintptr_t to = reinterpret_cast<uintptr_t>(dst), from = reinterpret_cast<uintptr_t>(src);
+    if (to + bytes <= from || from + bytes <= to) {
+        qk::platform::copy_pixels(dst, src, bytes);
+    } else {
+        memmove(dst, src, bytes);
+    }
+}
+
 // Same format: one block, or luma and chroma separately when the two images
 // record different chroma offsets (0 and width x height name the same place,
 // but a block of the recorded size would then run past the picture) or the
 // block would miss the chroma.
-// memmove, because converting an image into itself is a harmless no-op.
 void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copy_length) {
     if (qk::is_yuv420_format(src.format)) {
         const uint64_t luma_bytes = qk::yuv420_luma_bytes(src.width, src.height);
@@ -37,12 +48,12 @@ void copy_same_format(const QKImage& src, QKImage& dst, uint64_t copy_length) {
         // picture shorter than the size rule.
         if (src.chromaOffset != dst.chromaOffset || copy_length < dst_base + chroma_bytes ||
             copy_length > QKImage_size(&src)) {
-            memmove(dst.data, src.data, luma_bytes);
-            memmove(dst.data + dst_base, src.data + src_base, chroma_bytes);
+            move_bytes(dst.data, src.data, luma_bytes);
+            move_bytes(dst.data + dst_base, src.data + src_base, chroma_bytes);
             return;
         }
     }
-    memmove(dst.data, src.data, copy_length);
+    move_bytes(dst.data, src.data, copy_length);
 }
 
 }  // namespace

@@ -3,7 +3,6 @@
 #include "convert/kernels.h"
 
 #include <stddef.h>
-#include <string.h>
 
 #include "convert/row.h"
 #include "image/format.h"
@@ -127,8 +126,9 @@ void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
     }
     // Planar luma on both sides is one block; otherwise luma moves row by
     // row together with the chroma of the same rows, while they are cached.
+    const size_t pixels = static_cast<size_t>(width) * static_cast<size_t>(src.height);
     const bool block_luma = in.lumaStep == 1 && out.lumaStep == 1;
-    if (block_luma) memcpy(dst.data, src.data, static_cast<size_t>(width) * static_cast<size_t>(src.height));
+    if (block_luma) platform::copy_pixels(dst.data, src.data, pixels);
     const SampleRow luma = select_sample_row(in.lumaStep, out.lumaStep);
     const ChromaRow chroma = select_chroma_row(in.chromaStep, out.chromaStep);
     for (ptrdiff_t y = 0; y < src.height; ++y) {

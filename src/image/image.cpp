@@ -112,7 +112,7 @@ QKImage* QKImage_clone(const QKImage* source) {
     const uint64_t available = source->size != 0 ? source->size : UINT64_MAX;
     auto copy = [&](uint64_t to, uint64_t from, uint64_t length) {
         const uint64_t present = from < available ? std::min(length, available - from) : 0;
-        if (present != 0) memcpy(clone->data + to, source->data + from, present);
+        if (present != 0) qk::platform::copy_pixels(clone->data + to, source->data + from, present);
         memset(clone->data + to + present, 0, length - present);
     };
     if (source->chromaOffset != 0 && qk::is_yuv420_format(source->format)) {

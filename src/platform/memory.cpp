@@ -2,7 +2,12 @@
 
 #include <stdint.h>
 #include <stdlib.h>
+#include <string.h>
 #include <sys/mman.h>
+
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
 
 namespace qk::platform {
 namespace {
@@ -47,6 +52,34 @@ void* allocate_pixels(size_t bytes, bool cleared, bool map_in) {
         if (map_in) populate(memory, bytes);
     }
     return memory;
+}
+
+void copy_pixels(void* dst, const void* src, size_t bytes) {
+#if defined(__SSE2__)
+    auto* out = static_cast<uint8_t*>(dst);
+    const auto* in = static_cast<const uint8_t*>(src);
+    const bool stream = bytes >= kStreamBytes;
+    // Streaming stores need 16-byte aligned addresses.
+    const size_t head = stream ? (16 - reinterpret_cast<uintptr_t>(out) % 16) % 16 : 0;
+    memcpy(out, in, head);
+    size_t i = head;
+    const auto blocks = [&](auto store) {
+        for (; i + 64 <= bytes; i += 64) {
+            __m128i v[4];
+            for (int k = 0; k < 4; ++k) v[k] = _mm_loadu_si128(reinterpret_cast<const __m128i*>(in + i + 16 * k));
+            for (int k = 0; k < 4; ++k) store(reinterpret_cast<__m128i*>(out + i + 16 * k), v[k]);
+        }
+    };
+    if (stream) {
+        blocks([](__m128i* p, __m128i v) { _mm_stream_si128(p, v); });
+    } else {
+        blocks([](__m128i* p, __m128i v) { _mm_storeu_si128(p, v); });
+    }
+    memcpy(out + i, in + i, bytes - i);
+    if (stream) _mm_sfence();  // the streamed stores reach memory before anyone reads them
+#else
+    memcpy(dst, src, bytes);
+#endif
 }
 
 }  // namespace qk::platform
