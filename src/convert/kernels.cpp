@@ -129,6 +129,7 @@ void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
     const size_t pixels = static_cast<size_t>(width) * static_cast<size_t>(src.height);
     const bool block_luma = in.lumaStep == 1 && out.lumaStep == 1;
     if (block_luma) platform::copy_pixels(dst.data, src.data, pixels);
+    const bool stream = streamed(static_cast<ptrdiff_t>(find_format(dst.format)->size.bytes(pixels)));
     const SampleRow luma = select_sample_row(in.lumaStep, out.lumaStep);
     const ChromaRow chroma = select_chroma_row(in.chromaStep, out.chromaStep);
     for (ptrdiff_t y = 0; y < src.height; ++y) {
@@ -145,9 +146,10 @@ void convert_yuv_to_yuv(const QKImage& src, QKImage& dst) {
         } else {
             const ptrdiff_t offset = chroma_row_offset(in, y, width);
             chroma(src.data + in_chroma.u + offset, src.data + in_chroma.v + offset, in.chromaStep, u, v,
-                   out.chromaStep, src.width / 2);
+                   out.chromaStep, src.width / 2, stream);
         }
     }
+    if (stream) finish_streaming();
 }
 
 }  // namespace qk

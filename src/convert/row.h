@@ -15,8 +15,8 @@ namespace qk {
 
 // RGB to RGB: `width` pixels from src to dst.
 //
-// `stream` (here and in YuvToRgbShape): kernels with streaming stores may
-// write 4-byte pixels with them, past the caches, for a destination too
+// `stream` (here, in YuvToRgbShape and for ChromaRow): kernels with streaming stores may
+// write 4-byte pixels (chroma planes and pairs) with them, past the caches, for a destination too
 // large to stay there; the caller calls finish_streaming() after its last
 // row, before the pixels are read.
 struct RgbToRgbShape {
@@ -69,10 +69,10 @@ GreyToRgbRow select_grey_to_rgb_row(int dst_index);
 // and V together.
 using SampleRow = void (*)(const uint8_t* src, int src_step, uint8_t* dst, int dst_step, int count);
 using ChromaRow = void (*)(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_t* dst_u, uint8_t* dst_v,
-                           int dst_step, int count);
+                           int dst_step, int count, bool stream);
 void sample_row_reference(const uint8_t* src, int src_step, uint8_t* dst, int dst_step, int count);
 void chroma_row_reference(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_t* dst_u, uint8_t* dst_v,
-                          int dst_step, int count);
+                          int dst_step, int count, bool stream);
 SampleRow select_sample_row(int src_step, int dst_step);
 ChromaRow select_chroma_row(int src_step, int dst_step);
 // Planar luma and 4:2:0 chroma (`chromaStep` 1 or 2) to one row of packed

@@ -240,7 +240,7 @@ void sample_row(const uint8_t* src, int, uint8_t* dst, int, int count) {
 }
 
 template <int SrcStep, int DstStep>
-void chroma_row(const uint8_t* src_u, const uint8_t* src_v, int, uint8_t* dst_u, uint8_t* dst_v, int, int count) {
+void chroma_row(const uint8_t* src_u, const uint8_t* src_v, int, uint8_t* dst_u, uint8_t* dst_v, int, int count, bool) {
     chroma_loop(src_u, src_v, SrcStep, dst_u, dst_v, DstStep, count);
 }
 

@@ -49,7 +49,7 @@ void sample_row_reference(const uint8_t* src, int src_step, uint8_t* dst, int ds
 }
 
 void chroma_row_reference(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_t* dst_u, uint8_t* dst_v,
-                          int dst_step, int count) {
+                          int dst_step, int count, bool) {
     chroma_loop(src_u, src_v, src_step, dst_u, dst_v, dst_step, count);
 }
 

@@ -109,6 +109,26 @@ TEST(Convert, SameFormatIsCopiedInOneOrTwoBlocks) {
     }
 }
 
+// Frames of 4 MB and more are written past the caches, whole vectors at a
+// time from the first aligned byte: every byte still arrives, from and to
+// buffers at any alignment, and none past the frame.
+TEST(Convert, LargeFramesMoveWholeAtAnyAlignment) {
+    const int32_t w = 2000, h = 1400;
+    const size_t bytes = size_t(w) * h * 3 / 2, luma = size_t(w) * h;
+    for (size_t shift : {0, 1, 9}) {
+        for (uint32_t to : {NV12, NV21}) {
+            Frame src({NV12, w, h, bytes + 16}), dst({to, w, h, bytes + 16}, 5);
+            src.image.data += shift, dst.image.data += 16 - shift;
+            std::vector<uint8_t> expected = dst.buffer;
+            uint8_t* out = expected.data() + 16 - shift;
+            std::copy_n(src.image.data, bytes, out);
+            for (size_t i = luma; to == NV21 && i < bytes; i += 2) std::swap(out[i], out[i + 1]);
+            EXPECT_EQ(QKImage_convert(&src.image, &dst.image), QK_OK);
+            EXPECT_TRUE(dst.buffer == expected) << "shift " << shift << " to " << fourcc(to);
+        }
+    }
+}
+
 // Hand-checked conversions, as a check on the plain reference as much as on
 // the library: both formulas and the chroma orders of semi-planar and planar
 // 4:2:0. One spare byte stays.

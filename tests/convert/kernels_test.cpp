@@ -164,12 +164,15 @@ std::vector<std::pair<std::string, Run>> every_kernel() {
                 });
             }
             // V before U on the source side, U before V on the other.
-            all.emplace_back("chroma " + name, [=](const RowKernelSet* set, int w, Rows& r) {
-                QK_PICK(chroma_row_reference, chroma, from, to);
-                const auto [v, u] = r.chroma(false, from, w);
-                const auto [du, dv] = r.chroma(true, to, w);
-                return kernel(u, v, from, du, dv, to, w), true;
-            });
+            for (const bool stream : {false, true}) {
+                all.emplace_back("chroma " + name + (stream ? " streamed" : ""),
+                                 [=](const RowKernelSet* set, int w, Rows& r) {
+                                     QK_PICK(chroma_row_reference, chroma, from, to);
+                                     const auto [v, u] = r.chroma(false, from, w);
+                                     const auto [du, dv] = r.chroma(true, to, w);
+                                     return kernel(u, v, from, du, dv, to, w, stream), true;
+                                 });
+            }
         }
     }
     // Planar luma and 4:2:0 chroma (V first) into packed 4:2:2, U first or V

@@ -482,7 +482,7 @@ constexpr auto kSampleRows = sample_table(std::make_index_sequence<4>());
 
 template <int From, int To>
 void chroma_row(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_t* dst_u, uint8_t* dst_v,
-                int dst_step, int count) {
+                int dst_step, int count, bool stream) {
     ptrdiff_t i = 0;
     if constexpr (From == 1 && To == 1) {
         if (count > 0) {
@@ -507,7 +507,7 @@ void chroma_row(const uint8_t* src_u, const uint8_t* src_v, int src_step, uint8_
         }
     }
     chroma_row_reference(src_u + i * From, src_v + i * From, src_step, dst_u + i * To, dst_v + i * To, dst_step,
-                         static_cast<int>(count - i));
+                         static_cast<int>(count - i), stream);
 }
 
 template <size_t... I>
