@@ -58,6 +58,7 @@ QK_SIMD V v_setzero() { return _mm256_setzero_si256(); }
 // A block's 32 bytes, and 16 bytes widened to 16-bit lanes.
 QK_SIMD V load_block(const uint8_t* p) { return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(p)); }
 QK_SIMD void store_block(uint8_t* p, V value) { _mm256_storeu_si256(reinterpret_cast<__m256i*>(p), value); }
+QK_SIMD void store_block_streamed(uint8_t* p, V value) { _mm256_stream_si256(reinterpret_cast<__m256i*>(p), value); }
 QK_SIMD V widen_half(const uint8_t* p) {
     return _mm256_cvtepu8_epi16(_mm_loadu_si128(reinterpret_cast<const __m128i*>(p)));
 }

@@ -67,6 +67,7 @@ QK_SIMD V v_xor(V a, V b) { return _mm512_xor_si512(a, b); }
 QK_SIMD V v_setzero() { return _mm512_setzero_si512(); }
 QK_SIMD V load_block(const uint8_t* p) { return _mm512_loadu_si512(p); }
 QK_SIMD void store_block(uint8_t* p, V value) { _mm512_storeu_si512(p, value); }
+QK_SIMD void store_block_streamed(uint8_t* p, V value) { _mm512_stream_si512(reinterpret_cast<__m512i*>(p), value); }
 QK_SIMD V widen_half(const uint8_t* p) {
     return _mm512_cvtepu8_epi16(_mm256_loadu_si256(reinterpret_cast<const __m256i*>(p)));
 }

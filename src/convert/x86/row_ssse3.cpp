@@ -42,6 +42,7 @@ QK_SIMD V v_setzero() { return _mm_setzero_si128(); }
 // A block's 16 bytes, and 8 bytes widened to 16-bit lanes.
 QK_SIMD V load_block(const uint8_t* p) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
 QK_SIMD void store_block(uint8_t* p, V value) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), value); }
+QK_SIMD void store_block_streamed(uint8_t* p, V value) { _mm_stream_si128(reinterpret_cast<__m128i*>(p), value); }
 QK_SIMD V widen_half(const uint8_t* p) { return _mm_unpacklo_epi8(load_half(p, 0), _mm_setzero_si128()); }
 // With one lane, the order the in-lane operations see is the order in
 // memory (see row_avx2.cpp).
