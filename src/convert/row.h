@@ -15,10 +15,11 @@ namespace qk {
 
 // RGB to RGB: `width` pixels from src to dst.
 //
-// `stream` (here, in YuvToRgbShape and for ChromaRow): kernels with streaming stores may
-// write 4-byte pixels (chroma planes and pairs) with them, past the caches, for a destination too
-// large to stay there; the caller calls finish_streaming() after its last
-// row, before the pixels are read.
+// `stream` (here, in YuvToRgbShape and for ChromaRow): kernels with
+// streaming stores may write 4-byte pixels (and chroma planes and pairs)
+// with them, past the caches, for a destination too large to stay there;
+// the caller calls finish_streaming() after its last row, before the pixels
+// are read.
 struct RgbToRgbShape {
     RgbLayout src;
     RgbLayout dst;
